@@ -1,0 +1,117 @@
+#pragma once
+// The terminal's persistence: one SQLite database in the user's data folder,
+// in WAL mode. Every Save* call is one transaction, so a process killed between
+// two saves keeps everything the first one wrote.
+//
+// A database that is damaged, or that was written by a newer terminal, is never
+// touched: Open() renames it (with its -wal and -shm companions) next to itself
+// and starts a fresh one, and says so in the report.
+//
+// Not thread-safe; the terminal uses it from the UI thread only.
+#include <cstdint>
+#include <filesystem>
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+struct sqlite3;
+
+namespace term {
+
+struct StoreOpenReport {
+  enum class Outcome {
+    Opened,           // an existing database, in use
+    Created,          // no database yet; a new one was made
+    ReplacedCorrupt,  // the old one was unreadable; set aside, new one made
+    ReplacedNewer,    // the old one came from a newer terminal; set aside, new one made
+  };
+  Outcome outcome = Outcome::Opened;
+  std::filesystem::path path;          // the database in use
+  std::filesystem::path setAsidePath;  // where the old database went (Replaced*)
+  std::string message;                 // one line for the user (empty when Opened/Created)
+};
+
+// One watchlist as the terminal keeps it. `body` is the terminal's own text
+// (the watchlist XML); the store does not look inside.
+struct StoredWatchlist {
+  std::int32_t kind = 0;  // 0 user, 2 brand
+  std::int64_t id = 0;
+  std::string name;
+  std::string body;
+};
+
+// One price alert; `body` is the terminal's own serialised record.
+struct StoredAlert {
+  std::int64_t id = 0;
+  std::string body;
+};
+
+// One open view of the saved layout, in opening order.
+struct StoredView {
+  std::string className;
+  std::string objectName;  // the dock's name; the main window state refers to it
+  std::int64_t productId = -1;
+  std::string instrumentCode;
+  std::map<std::string, std::string> params;  // start parameters, UTF-8
+};
+
+struct StoredLayout {
+  std::vector<StoredView> views;
+  std::string windowGeometry;  // opaque bytes from the main window
+  std::string windowState;     // opaque bytes from the main window (docks, tabs, floating)
+  bool empty() const { return views.empty() && windowGeometry.empty() && windowState.empty(); }
+};
+
+class Store {
+ public:
+  static constexpr int kSchemaVersion = 1;
+  static constexpr const char* kFileName = "terminal.db";
+
+  // $XDG_DATA_HOME/marketviews-terminal, or ~/.local/share/marketviews-terminal.
+  static std::filesystem::path DefaultDataDir();
+
+  // Opens (creating the folder and database as needed) <dir>/terminal.db.
+  // Null with `error` set when the folder or a fresh database cannot be made.
+  static std::unique_ptr<Store> Open(const std::filesystem::path& dir, StoreOpenReport& report,
+                                     std::string& error);
+  ~Store();
+  Store(const Store&) = delete;
+  Store& operator=(const Store&) = delete;
+
+  const std::filesystem::path& Path() const { return m_path; }
+  // The text of the last failure of a Save*/Load* call.
+  const std::string& LastError() const { return m_error; }
+
+  // Settings: flat key/value texts. SaveSettings replaces them all.
+  std::map<std::string, std::string> LoadSettings();
+  bool SaveSettings(const std::map<std::string, std::string>& settings);
+
+  // Watchlists of one kind, in their saved order. Save replaces that kind.
+  std::vector<StoredWatchlist> LoadWatchlists(std::int32_t kind);
+  bool SaveWatchlists(std::int32_t kind, const std::vector<StoredWatchlist>& lists);
+
+  // Alerts in id order. Save replaces them all.
+  std::vector<StoredAlert> LoadAlerts();
+  bool SaveAlerts(const std::vector<StoredAlert>& alerts);
+
+  StoredLayout LoadLayout();
+  bool SaveLayout(const StoredLayout& layout);
+
+ private:
+  explicit Store(sqlite3* db, std::filesystem::path path) : m_db(db), m_path(std::move(path)) {}
+  bool Exec(const char* sql);
+  bool Fail(const char* what);
+  class Transaction;
+
+  sqlite3* m_db = nullptr;
+  std::filesystem::path m_path;
+  std::string m_error;
+};
+
+// Start parameters travel as one JSON object text in the layout table.
+std::string EncodeParams(const std::map<std::string, std::string>& params);
+// Malformed text gives an empty map.
+std::map<std::string, std::string> DecodeParams(const std::string& text);
+
+}  // namespace term
