@@ -289,8 +289,8 @@ bool Store::SaveSettings(const std::map<std::string, std::string>& settings) {
   return tx.Commit();
 }
 
-std::vector<StoredWatchlist> Store::LoadWatchlists(std::int32_t kind) {
-  std::vector<StoredWatchlist> out;
+std::vector<WatchlistRow> Store::LoadWatchlists(std::int32_t kind) {
+  std::vector<WatchlistRow> out;
   Stmt s(m_db, "SELECT id, name, body FROM watchlists WHERE kind = ? ORDER BY position");
   if (!s.ok()) { Fail("load watchlists"); return out; }
   s.Bind(1, kind);
@@ -298,7 +298,7 @@ std::vector<StoredWatchlist> Store::LoadWatchlists(std::int32_t kind) {
   return out;
 }
 
-bool Store::SaveWatchlists(std::int32_t kind, const std::vector<StoredWatchlist>& lists) {
+bool Store::SaveWatchlists(std::int32_t kind, const std::vector<WatchlistRow>& lists) {
   Transaction tx(*this);
   if (!tx.open()) return false;
   {
@@ -314,15 +314,15 @@ bool Store::SaveWatchlists(std::int32_t kind, const std::vector<StoredWatchlist>
   return tx.Commit();
 }
 
-std::vector<StoredAlert> Store::LoadAlerts() {
-  std::vector<StoredAlert> out;
+std::vector<AlertRow> Store::LoadAlerts() {
+  std::vector<AlertRow> out;
   Stmt s(m_db, "SELECT id, body FROM alerts ORDER BY id");
   if (!s.ok()) { Fail("load alerts"); return out; }
   while (s.Step() == SQLITE_ROW) out.push_back({s.Int(0), s.Text(1)});
   return out;
 }
 
-bool Store::SaveAlerts(const std::vector<StoredAlert>& alerts) {
+bool Store::SaveAlerts(const std::vector<AlertRow>& alerts) {
   Transaction tx(*this);
   if (!tx.open() || !Exec("DELETE FROM alerts")) return false;
   Stmt ins(m_db, "INSERT INTO alerts(id, body) VALUES(?, ?)");
@@ -332,8 +332,8 @@ bool Store::SaveAlerts(const std::vector<StoredAlert>& alerts) {
   return tx.Commit();
 }
 
-StoredLayout Store::LoadLayout() {
-  StoredLayout out;
+SavedLayout Store::LoadLayout() {
+  SavedLayout out;
   {
     Stmt s(m_db,
            "SELECT class_name, object_name, product_id, instrument_code, params FROM layout_views ORDER BY position");
@@ -351,7 +351,7 @@ StoredLayout Store::LoadLayout() {
   return out;
 }
 
-bool Store::SaveLayout(const StoredLayout& layout) {
+bool Store::SaveLayout(const SavedLayout& layout) {
   Transaction tx(*this);
   if (!tx.open() || !Exec("DELETE FROM layout_views") || !Exec("DELETE FROM layout_state")) return false;
   Stmt ins(m_db,

@@ -34,7 +34,7 @@ struct StoreOpenReport {
 
 // One watchlist as the terminal keeps it. `body` is the terminal's own text
 // (the watchlist XML); the store does not look inside.
-struct StoredWatchlist {
+struct WatchlistRow {
   std::int32_t kind = 0;  // 0 user, 2 brand
   std::int64_t id = 0;
   std::string name;
@@ -42,13 +42,13 @@ struct StoredWatchlist {
 };
 
 // One price alert; `body` is the terminal's own serialised record.
-struct StoredAlert {
+struct AlertRow {
   std::int64_t id = 0;
   std::string body;
 };
 
 // One open view of the saved layout, in opening order.
-struct StoredView {
+struct SavedView {
   std::string className;
   std::string objectName;  // the dock's name; the main window state refers to it
   std::int64_t productId = -1;
@@ -56,8 +56,8 @@ struct StoredView {
   std::map<std::string, std::string> params;  // start parameters, UTF-8
 };
 
-struct StoredLayout {
-  std::vector<StoredView> views;
+struct SavedLayout {
+  std::vector<SavedView> views;
   std::string windowGeometry;  // opaque bytes from the main window
   std::string windowState;     // opaque bytes from the main window (docks, tabs, floating)
   bool empty() const { return views.empty() && windowGeometry.empty() && windowState.empty(); }
@@ -88,15 +88,15 @@ class Store {
   bool SaveSettings(const std::map<std::string, std::string>& settings);
 
   // Watchlists of one kind, in their saved order. Save replaces that kind.
-  std::vector<StoredWatchlist> LoadWatchlists(std::int32_t kind);
-  bool SaveWatchlists(std::int32_t kind, const std::vector<StoredWatchlist>& lists);
+  std::vector<WatchlistRow> LoadWatchlists(std::int32_t kind);
+  bool SaveWatchlists(std::int32_t kind, const std::vector<WatchlistRow>& lists);
 
   // Alerts in id order. Save replaces them all.
-  std::vector<StoredAlert> LoadAlerts();
-  bool SaveAlerts(const std::vector<StoredAlert>& alerts);
+  std::vector<AlertRow> LoadAlerts();
+  bool SaveAlerts(const std::vector<AlertRow>& alerts);
 
-  StoredLayout LoadLayout();
-  bool SaveLayout(const StoredLayout& layout);
+  SavedLayout LoadLayout();
+  bool SaveLayout(const SavedLayout& layout);
 
  private:
   explicit Store(sqlite3* db, std::filesystem::path path) : m_db(db), m_path(std::move(path)) {}

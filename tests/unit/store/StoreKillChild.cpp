@@ -18,7 +18,7 @@ int main(int argc, char** argv) {
   }
   for (long n = 1;; ++n) {
     // One save writes the counter and n watchlists: after a kill the two must agree.
-    std::vector<term::StoredWatchlist> lists;
+    std::vector<term::WatchlistRow> lists;
     for (long i = 0; i < n % 50 + 1; ++i)
       lists.push_back({0, i, "list " + std::to_string(i), "<n>" + std::to_string(n) + "</n>"});
     if (!store->SaveWatchlists(0, lists)) return 3;

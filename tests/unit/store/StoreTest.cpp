@@ -51,8 +51,8 @@ void RunSql(const fs::path& db, const char* sql) {
   sqlite3_close(h);
 }
 
-term::StoredLayout SampleLayout() {
-  term::StoredLayout layout;
+term::SavedLayout SampleLayout() {
+  term::SavedLayout layout;
   layout.views.push_back({"CPriceViewAdv", "dock-CPriceViewAdv-1", -1, "", {{"User_field_display_mode", "1"}}});
   layout.views.push_back({"CMarketDepthAdv", "dock-CMarketDepthAdv-1", 7, "D05 \"q\"\\",
                           {{"User_field_product_id", "7"}, {"User_field_save_space", "0"}}});
@@ -233,7 +233,7 @@ TEST_F(StoreSetAside, Corrupt_DamagedPagesAreKeptAndReported) {
   {
     StoreOpenReport report;
     auto store = OpenOk(dir.path, report);
-    std::vector<term::StoredWatchlist> lists;
+    std::vector<term::WatchlistRow> lists;
     for (int i = 0; i < 400; ++i) lists.push_back({0, i, "list " + std::to_string(i), std::string(200, 'w')});
     ASSERT_TRUE(store->SaveWatchlists(0, lists));
   }
