@@ -1,0 +1,198 @@
+#pragma once
+// The simulated market the terminal plays when it has no exchange connection.
+//
+// Reference data (products, exchanges, instruments, price-step tables, sectors)
+// is generated once from the seed. Prices follow a seeded random walk per
+// instrument; quotes, a 99-level book, the trade tape and the trade summary
+// stay coherent with each other. Time moves only through AdvanceTo(tick), in
+// fixed steps of `kStepMs`, so the same seed and the same sequence of ticks
+// (and of interest changes) give the same market.
+//
+// Plain C++, no Qt, single-threaded.
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "hostview/AlertRecords.h"
+#include "hostview/HostLists.h"
+#include "hostview/Records.h"
+
+namespace sim {
+
+struct MarketConfig {
+  std::uint64_t seed = 20261207;
+  int instruments = 3000;            // clamped to 60 .. 500000
+  int fieldUpdatesPerSecond = 4000;  // target over the instruments of interest
+  std::string sessionDate = "2026-12-07";
+  int sessionStartSeconds = 10 * 3600 + 30 * 60;  // time of day at `startTick`
+  std::uint32_t startTick = 0;
+};
+
+// One trade of the tape. Trade numbers start at 1 and are the position + 1.
+struct Trade {
+  std::uint32_t timeMs = 0;  // milliseconds since midnight of the session date
+  std::int32_t volume = 0;
+  double price = 0.0;
+  std::uint8_t side = 1;     // 0 married deal, 1 at the ask (buy), 2 at the bid (sell), 3 auction
+};
+
+// One line of the trade summary (traded volume at one price).
+struct SummaryLine {
+  double price = 0.0;
+  std::int64_t trades = 0;
+  std::int64_t volume = 0;
+  std::int64_t bidVolume = 0;  // traded on the bid (side 2)
+  std::int64_t askVolume = 0;  // traded on the ask (side 1)
+};
+
+// Current quote of one instrument.
+struct Quote {
+  double bid = 0, ask = 0, last = 0, open = 0, high = 0, low = 0, close = 0;  // close: previous close
+  std::int64_t bidVolume = 0, askVolume = 0, volume = 0;
+  double turnover = 0;
+  std::int32_t trades = 0;
+  std::string remarks;     // exchange remark code, often empty
+  std::string cfdStatus;   // "L/S", "L/-", "-/S", "-/-", "Call" or empty
+  std::string dmaStatus;
+  std::string month, year; // futures contract month ("DEC") and year ("2026")
+};
+
+// One book level.
+struct DepthLevel {
+  double bid = 0, ask = 0;      // 0: no price at this level
+  std::int64_t bidVolume = 0, askVolume = 0;
+  std::int32_t bidOrders = 0, askOrders = 0;
+};
+
+// A user watchlist the terminal offers on first start.
+struct StarterWatchlist {
+  std::string name;
+  std::vector<int> instruments;  // instrument indices
+};
+
+// A brand (KELDO) watchlist.
+struct BrandWatchlist {
+  std::int32_t id = 0;
+  std::string name;
+  std::vector<int> instruments;
+};
+
+class Market {
+ public:
+  static constexpr std::uint32_t kStepMs = 50;
+  static constexpr int kTradePageSize = 100;
+  static constexpr int kLivePage = 99998;
+  static constexpr int kHeaderParam = 99999;
+  static constexpr int kSummaryPageSize = 40;
+  static constexpr int kDepthLevels = 99;
+
+  explicit Market(const MarketConfig& config);
+  ~Market();
+  Market(const Market&) = delete;
+  Market& operator=(const Market&) = delete;
+
+  const MarketConfig& Config() const;
+
+  // ---- Reference data (stable for the life of the market) --------------------
+  const std::vector<JProduct>& Products() const;
+  const std::vector<JExchangeList>& Exchanges() const;
+  const std::vector<JInstrumentUnderlying>& Instruments() const;
+  const std::vector<TickBand>& TickBands() const;
+  const std::vector<JSector>& Sectors() const;
+  const std::vector<JRemarkMessage>& RemarkMessages() const;
+  // -1 when unknown.
+  int Find(std::int64_t productId, std::string_view code) const;
+  int FindByCode(std::string_view code) const;       // first instrument with that code
+  int FindByChartCode(std::string_view chartCode) const;
+  const JExchangeList* FindExchange(std::string_view code) const;
+  const JProduct* FindProduct(std::int64_t productId) const;
+  JMarketInfo MarketInfo(std::string_view exchangeCode) const;
+  // The step at `price` in `tableId` (table 0 when the table has no band there).
+  double StepAt(std::int32_t tableId, double price, bool up = true) const;
+
+  // ---- Time ----------------------------------------------------------------------
+  // Runs every whole step up to `now` (unsigned tick difference from the last).
+  void AdvanceTo(std::uint32_t now);
+  std::uint32_t Now() const;
+  // Session clock: "YYYY-MM-DD", "HH:MM:SS", milliseconds since midnight.
+  std::string DateText() const;
+  std::string TimeText() const;
+  std::uint32_t TimeOfDayMs() const;
+
+  // ---- Interest --------------------------------------------------------------------
+  // Instruments someone watches get the configured update rate; the rest move
+  // slowly in the background. Counted: Add twice needs Remove twice.
+  void AddInterest(int index);
+  void RemoveInterest(int index);
+  int InterestCount() const;
+
+  // Instruments whose values changed since the last call, sorted, each once.
+  std::vector<int> TakeChanged();
+
+  // ---- Values ---------------------------------------------------------------------
+  const Quote& QuoteOf(int index);
+  DepthLevel Depth(int index, int level);   // level 1..99
+  const std::vector<Trade>& Trades(int index);
+  std::vector<SummaryLine> Summary(int index);  // by price, highest first
+
+  // The value text of a field as the views receive it (410/412), "" when none.
+  // kind 0: quote fields (and depth fields at level 1); kind 1: depth fields at
+  // level `param`; kind 2: time-and-sales header (param 0/99999) or "TRADEDATA"
+  // of page `param`; kind 3: trade-summary header fields or "TRADEDATA" of
+  // summary page `param`.
+  std::string FieldValue(int index, std::string_view field, int param, int kind);
+
+  // Text layouts.
+  std::string TradePageText(int index, int page);    // "TRADEDATA" of a page (1..999, 99998)
+  int TradePageCount(int index);
+  std::string SummaryPageText(int index, int page);  // 40 lines + a "TOTALS:" item
+  int SummaryPageCount(int index);
+  std::string FormatPrice(int index, double price) const;
+
+  // ---- Lists -------------------------------------------------------------------------
+  // Gainers, losers and most active per exchange, computed from the current quotes.
+  std::vector<JTop30Group> Top30();
+  const std::vector<BrandWatchlist>& BrandWatchlists() const;
+  std::vector<int> WorldIndices() const;
+  const std::vector<StarterWatchlist>& StarterWatchlists() const;
+
+  struct Impl;
+
+ private:
+  std::unique_ptr<Impl> d;
+};
+
+// Keeps the price alerts and moves them through their states.
+class AlertBook {
+ public:
+  // Replaces all alerts (loaded from the store); the next id follows the highest.
+  void Load(std::vector<PriceAlertItem> alerts);
+  // Returns the new id; status becomes "Active".
+  std::int32_t Create(PriceAlertItem item);
+  // False when the id is unknown. The status stays the terminal's.
+  bool Update(const PriceAlertItem& item);
+  // Number of alerts removed.
+  int Remove(const std::vector<std::int32_t>& ids);
+  const std::vector<PriceAlertItem>& All() const { return alerts_; }
+  const PriceAlertItem* Find(std::int32_t id) const;
+
+  struct Fired {
+    PriceAlertItem alert;  // after the change
+    double value = 0;
+  };
+  // Checks every live alert against the market at its current time: an alert
+  // whose validUntil lies before the session date becomes "Expired"; one whose
+  // condition holds becomes "Triggered" (a repeating alert fires again each time
+  // the condition turns true again). Returns the alerts that fired; `changed`
+  // is set when any status changed.
+  std::vector<Fired> Evaluate(Market& market, bool* changed);
+
+ private:
+  std::vector<PriceAlertItem> alerts_;
+  std::vector<bool> conditionWasTrue_;
+  std::int32_t nextId_ = 1;
+};
+
+}  // namespace sim
