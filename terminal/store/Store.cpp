@@ -42,6 +42,9 @@ CREATE TABLE layout_views (
   instrument_code TEXT NOT NULL,
   params          TEXT NOT NULL
 );
+CREATE TABLE saved_sets (
+  name TEXT PRIMARY KEY
+);
 CREATE TABLE layout_state (
   key   TEXT PRIMARY KEY,
   value BLOB NOT NULL
@@ -289,6 +292,41 @@ bool Store::SaveSettings(const std::map<std::string, std::string>& settings) {
   return tx.Commit();
 }
 
+bool Store::SaveSetting(const std::string& key, const std::string& value) {
+  Transaction tx(*this);
+  if (!tx.open()) return false;
+  if (value.empty()) {
+    Stmt del(m_db, "DELETE FROM settings WHERE key = ?");
+    if (!del.ok() || !del.Bind(1, key).Run()) return Fail("save setting");
+  } else {
+    Stmt up(m_db, "INSERT INTO settings(key, value) VALUES(?, ?) ON CONFLICT(key) DO UPDATE SET value = excluded.value");
+    if (!up.ok() || !up.Bind(1, key).Bind(2, value).Run()) return Fail("save setting");
+  }
+  return tx.Commit();
+}
+
+std::map<std::string, std::string> Store::LoadSettings(const std::string& prefix) {
+  std::map<std::string, std::string> out;
+  for (auto& [k, v] : LoadSettings())
+    if (k.size() > prefix.size() && k.compare(0, prefix.size(), prefix) == 0) out[k.substr(prefix.size())] = v;
+  return out;
+}
+
+bool Store::MarkSaved(const std::string& set) {
+  Stmt s(m_db, "INSERT OR IGNORE INTO saved_sets(name) VALUES(?)");
+  return s.ok() && s.Bind(1, set).Run();
+}
+
+bool Store::HasSaved(const std::string& set) {
+  Stmt s(m_db, "SELECT 1 FROM saved_sets WHERE name = ?");
+  if (!s.ok()) return false;
+  s.Bind(1, set);
+  return s.Step() == SQLITE_ROW;
+}
+
+bool Store::HasSavedWatchlists(std::int32_t kind) { return HasSaved("watchlists." + std::to_string(kind)); }
+bool Store::HasSavedAlerts() { return HasSaved("alerts"); }
+
 std::vector<WatchlistRow> Store::LoadWatchlists(std::int32_t kind) {
   std::vector<WatchlistRow> out;
   Stmt s(m_db, "SELECT id, name, body FROM watchlists WHERE kind = ? ORDER BY position");
@@ -311,6 +349,7 @@ bool Store::SaveWatchlists(std::int32_t kind, const std::vector<WatchlistRow>& l
   for (const auto& w : lists)
     if (!ins.Bind(1, kind).Bind(2, w.id).Bind(3, position++).Bind(4, w.name).Bind(5, w.body).Run())
       return Fail("save watchlists");
+  if (!MarkSaved("watchlists." + std::to_string(kind))) return Fail("save watchlists");
   return tx.Commit();
 }
 
@@ -329,6 +368,7 @@ bool Store::SaveAlerts(const std::vector<AlertRow>& alerts) {
   if (!ins.ok()) return Fail("save alerts");
   for (const auto& a : alerts)
     if (!ins.Bind(1, a.id).Bind(2, a.body).Run()) return Fail("save alerts");
+  if (!MarkSaved("alerts")) return Fail("save alerts");
   return tx.Commit();
 }
 
@@ -347,6 +387,7 @@ SavedLayout Store::LoadLayout() {
     const std::string key = st.Text(0);
     if (key == "geometry") out.windowGeometry = st.Text(1);
     else if (key == "state") out.windowState = st.Text(1);
+    else if (key == "active") out.activeView = st.Text(1);
   }
   return out;
 }
@@ -366,7 +407,8 @@ bool Store::SaveLayout(const SavedLayout& layout) {
   Stmt st(m_db, "INSERT INTO layout_state(key, value) VALUES(?, ?)");
   if (!st.ok()) return Fail("save layout");
   if (!st.Bind(1, std::string("geometry")).BindBlob(2, layout.windowGeometry).Run() ||
-      !st.Bind(1, std::string("state")).BindBlob(2, layout.windowState).Run())
+      !st.Bind(1, std::string("state")).BindBlob(2, layout.windowState).Run() ||
+      !st.Bind(1, std::string("active")).BindBlob(2, layout.activeView).Run())
     return Fail("save layout");
   return tx.Commit();
 }

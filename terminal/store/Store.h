@@ -60,6 +60,7 @@ struct SavedLayout {
   std::vector<SavedView> views;
   std::string windowGeometry;  // opaque bytes from the main window
   std::string windowState;     // opaque bytes from the main window (docks, tabs, floating)
+  std::string activeView;      // object name of the active view's dock
   bool empty() const { return views.empty() && windowGeometry.empty() && windowState.empty(); }
 };
 
@@ -86,10 +87,19 @@ class Store {
   // Settings: flat key/value texts. SaveSettings replaces them all.
   std::map<std::string, std::string> LoadSettings();
   bool SaveSettings(const std::map<std::string, std::string>& settings);
+  // Sets one key (an empty value removes it), leaving the others.
+  bool SaveSetting(const std::string& key, const std::string& value);
+  // Settings whose key starts with `prefix`, with the prefix removed.
+  std::map<std::string, std::string> LoadSettings(const std::string& prefix);
 
   // Watchlists of one kind, in their saved order. Save replaces that kind.
   std::vector<WatchlistRow> LoadWatchlists(std::int32_t kind);
   bool SaveWatchlists(std::int32_t kind, const std::vector<WatchlistRow>& lists);
+
+  // Whether SaveWatchlists(kind) / SaveAlerts ever ran (an empty saved set is
+  // not the same as nothing saved yet).
+  bool HasSavedWatchlists(std::int32_t kind);
+  bool HasSavedAlerts();
 
   // Alerts in id order. Save replaces them all.
   std::vector<AlertRow> LoadAlerts();
@@ -102,6 +112,8 @@ class Store {
   explicit Store(sqlite3* db, std::filesystem::path path) : m_db(db), m_path(std::move(path)) {}
   bool Exec(const char* sql);
   bool Fail(const char* what);
+  bool MarkSaved(const std::string& set);
+  bool HasSaved(const std::string& set);
   class Transaction;
 
   sqlite3* m_db = nullptr;

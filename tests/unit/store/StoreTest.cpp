@@ -59,6 +59,7 @@ term::SavedLayout SampleLayout() {
   layout.views.push_back({"CTradeView", "dock-CTradeView-1", 3, "ÄÖ-é", {}});
   layout.windowGeometry = std::string("\x01\x00\xff geometry", 12);
   layout.windowState = std::string("state\x00with nul", 14);
+  layout.activeView = "dock-CMarketDepthAdv-1";
   return layout;
 }
 
@@ -109,6 +110,7 @@ TEST(Store, RoundTrip_EverythingSavedComesBackAfterReopen) {
   }
   EXPECT_EQ(back.windowGeometry, layout.windowGeometry);
   EXPECT_EQ(back.windowState, layout.windowState);
+  EXPECT_EQ(back.activeView, layout.activeView);
 }
 
 TEST(Store, Save_ReplacesOnlyWhatItSaves) {
@@ -275,4 +277,90 @@ TEST(Store, DefaultDataDir_FollowsXdgDataHome) {
   setenv("XDG_DATA_HOME", "relative", 1);  // ignored, as the XDG rules say
   setenv("HOME", "/home/someone", 1);
   EXPECT_EQ(Store::DefaultDataDir(), fs::path("/home/someone/.local/share/marketviews-terminal"));
+}
+
+// ---- The host runtime's store on SQLite --------------------------------------
+
+#include "terminal/store/SqliteHostStore.h"
+
+TEST(SqliteHostStore, RoundTrip_WatchlistsAlertsAndSettingsSurviveReopen) {
+  TempDir dir;
+  PriceAlertItem alert;
+  alert.alertId = 4;
+  alert.productId = 12;
+  alert.exchangeCode = "SGX";
+  alert.instrumentCode = "D05 \"x\"";
+  alert.triggerOnce = false;
+  alert.validUntil = "2026-12-31";
+  alert.priceField = "BID";
+  alert.comparator = "<=";
+  alert.triggerValue = 31.25;
+  alert.viaEmail = true;
+  alert.status = "Triggered";
+  alert.hostTextA = "2026-12-07 10:31:00";
+  alert.hostNumber = 2;
+  {
+    StoreOpenReport report;
+    auto store = OpenOk(dir.path, report);
+    term::SqliteHostStore host(*store);
+    std::vector<term::StoredWatchlist> loaded;
+    EXPECT_FALSE(host.LoadWatchlists(loaded)) << "nothing saved yet";
+    std::vector<PriceAlertItem> alerts;
+    EXPECT_FALSE(host.LoadAlerts(alerts));
+
+    term::StoredWatchlist user;
+    user.id = 7;
+    user.name = "Banks & <Co>";
+    user.items = {{1, "D05"}, {2, "O39 \\ odd"}};
+    term::StoredWatchlist brand;
+    brand.id = 1;
+    brand.kind = term::StoredWatchlist::Brand;
+    brand.name = "Brand";
+    brand.items = {{3, "[KELDO]X1"}};
+    host.SaveWatchlists(term::StoredWatchlist::User, {user});
+    host.SaveWatchlists(term::StoredWatchlist::Brand, {brand});
+    host.SaveAlerts({alert});
+    host.SaveSetting("MAXWL", "300");
+    host.SaveSetting("WLNOT", "1");
+    host.SaveSetting("WLNOT", "");  // removed
+    ASSERT_TRUE(store->SaveSetting("ui.style", "2"));  // another part of the terminal
+  }
+  StoreOpenReport report;
+  auto store = OpenOk(dir.path, report);
+  term::SqliteHostStore host(*store);
+  std::vector<term::StoredWatchlist> lists;
+  ASSERT_TRUE(host.LoadWatchlists(lists));
+  ASSERT_EQ(lists.size(), 2u);
+  EXPECT_EQ(lists[0].name, "Banks & <Co>");
+  EXPECT_EQ(lists[0].kind, term::StoredWatchlist::User);
+  ASSERT_EQ(lists[0].items.size(), 2u);
+  EXPECT_EQ(lists[0].items[1].instrumentCode, "O39 \\ odd");
+  EXPECT_EQ(lists[1].kind, term::StoredWatchlist::Brand);
+  EXPECT_EQ(lists[1].items[0].instrumentCode, "[KELDO]X1");
+
+  std::vector<PriceAlertItem> alerts;
+  ASSERT_TRUE(host.LoadAlerts(alerts));
+  ASSERT_EQ(alerts.size(), 1u);
+  EXPECT_EQ(alerts[0].instrumentCode, alert.instrumentCode);
+  EXPECT_EQ(alerts[0].triggerOnce, false);
+  EXPECT_EQ(alerts[0].comparator, "<=");
+  EXPECT_DOUBLE_EQ(alerts[0].triggerValue, 31.25);
+  EXPECT_EQ(alerts[0].status, "Triggered");
+  EXPECT_DOUBLE_EQ(alerts[0].hostNumber, 2);
+
+  EXPECT_EQ(host.LoadSettings(), (std::map<std::string, std::string>{{"MAXWL", "300"}}));
+}
+
+TEST(SqliteHostStore, Load_EmptySavedSetIsNotNothingSaved) {
+  TempDir dir;
+  StoreOpenReport report;
+  auto store = OpenOk(dir.path, report);
+  term::SqliteHostStore host(*store);
+  host.SaveWatchlists(term::StoredWatchlist::User, {});
+  host.SaveAlerts({});
+  std::vector<term::StoredWatchlist> lists;
+  std::vector<PriceAlertItem> alerts;
+  EXPECT_TRUE(host.LoadWatchlists(lists));  // the user deleted them all: no starter lists again
+  EXPECT_TRUE(lists.empty());
+  EXPECT_TRUE(host.LoadAlerts(alerts));
 }
