@@ -1,0 +1,180 @@
+#include "chart/BarChart.h"
+
+#include <QBarCategoryAxis>
+#include <QBarSeries>
+#include <QBarSet>
+#include <QChart>
+#include <QChartView>
+#include <QCursor>
+#include <QScrollBar>
+#include <QToolTip>
+#include <QVBoxLayout>
+#include <QValueAxis>
+#include <QWheelEvent>
+#include <algorithm>
+#include <cmath>
+
+CBarChart::CBarChart(QWidget* parent) : QWidget(parent) {
+  m_chart = new QChart();
+  m_chart->setAnimationOptions(QChart::NoAnimation);
+  m_chart->legend()->setVisible(true);
+  m_chart->legend()->setAlignment(Qt::AlignTop);
+  m_chart->setMargins(QMargins(4, 4, 4, 4));
+  m_chart->setBackgroundRoundness(0);
+  m_bars = new QBarSeries();
+  m_bars->setBarWidth(0.8);
+  m_chart->addSeries(m_bars);
+  m_axisX = new QBarCategoryAxis();
+  m_axisY = new QValueAxis();
+  m_axisY->setLabelFormat(QStringLiteral("%.0f"));
+  m_axisY->setRange(0, 1);
+  m_chart->addAxis(m_axisX, Qt::AlignBottom);
+  m_chart->addAxis(m_axisY, Qt::AlignLeft);
+  m_bars->attachAxis(m_axisX);
+  m_bars->attachAxis(m_axisY);
+
+  m_view = new QChartView(m_chart, this);
+  m_view->setRenderHint(QPainter::Antialiasing, true);
+  m_view->setFrameShape(QFrame::NoFrame);
+  m_scroll = new QScrollBar(Qt::Horizontal, this);
+  m_scroll->setRange(0, 0);
+  connect(m_scroll, &QScrollBar::valueChanged, this, [this](int v) {
+    if (!m_updatingScroll) SetScrollPos(v);
+  });
+  auto* layout = new QVBoxLayout(this);
+  layout->setContentsMargins(0, 0, 0, 0);
+  layout->setSpacing(0);
+  layout->addWidget(m_view, 1);
+  layout->addWidget(m_scroll);
+
+  // One tooltip per bar group, whichever series' bar the pointer is on.
+  connect(m_bars, &QBarSeries::hovered, this, [this](bool status, int index, QBarSet*) {
+    const auto visible = VisibleGroups();
+    if (status && index >= 0 && index < int(visible.size()))
+      QToolTip::showText(QCursor::pos(), TooltipOf(visible[std::size_t(index)]), m_view);
+    else
+      QToolTip::hideText();
+  });
+  UpdateScrollBar();
+}
+
+CBarChart::~CBarChart() = default;
+
+void CBarChart::AddSeries(const QString& legend, COLORREF color) {
+  m_series.push_back({legend, color});
+  Rebuild();
+}
+
+void CBarChart::SetTitle(const QString& title) { m_chart->setTitle(title); }
+
+QString CBarChart::SeriesLegend(int i) const {
+  return i >= 0 && i < SeriesCount() ? m_series[std::size_t(i)].legend : QString();
+}
+
+COLORREF CBarChart::SeriesColor(int i) const {
+  return i >= 0 && i < SeriesCount() ? m_series[std::size_t(i)].color : 0;
+}
+
+void CBarChart::AddGroup(Group group) {
+  m_groups.push_back(std::move(group));
+  UpdateScrollBar();
+}
+
+void CBarChart::SetGroups(std::vector<Group> groups) {
+  m_groups = std::move(groups);
+  m_first = std::clamp(m_first, 0, std::max(0, GroupCount() - m_window));
+  UpdateScrollBar();
+}
+
+void CBarChart::SetWindowSize(int groups) {
+  m_window = std::max(1, groups);
+  SetScrollPos(m_first);
+}
+
+void CBarChart::SetScrollPos(int first) {
+  const int clamped = std::clamp(first, 0, std::max(0, GroupCount() - m_window));
+  if (clamped == m_first && m_scroll->value() == clamped) return;
+  m_first = clamped;
+  UpdateScrollBar();
+  Rebuild();
+}
+
+std::vector<int> CBarChart::VisibleGroups() const {
+  std::vector<int> out;
+  for (int i = m_first; i < GroupCount() && i < m_first + m_window; ++i) out.push_back(i);
+  return out;
+}
+
+void CBarChart::SetupRange(double minimum, double headroomPercent) {
+  m_min = minimum;
+  m_headroom = std::max(0.0, headroomPercent);
+  Rebuild();
+}
+
+double CBarChart::AxisMin() const { return m_axisY->min(); }
+double CBarChart::AxisMax() const { return m_axisY->max(); }
+
+void CBarChart::Clear() {
+  m_groups.clear();
+  m_first = 0;
+  UpdateScrollBar();
+  Rebuild();
+}
+
+void CBarChart::Redraw() {
+  Rebuild();
+  m_view->viewport()->repaint();
+}
+
+QString CBarChart::TooltipOf(int index) const {
+  return index >= 0 && index < GroupCount() ? m_groups[std::size_t(index)].tooltip : QString();
+}
+
+void CBarChart::UpdateScrollBar() {
+  m_updatingScroll = true;
+  m_scroll->setRange(0, std::max(0, GroupCount() - m_window));
+  m_scroll->setPageStep(m_window);
+  m_scroll->setValue(m_first);
+  m_scroll->setVisible(GroupCount() > m_window);
+  m_updatingScroll = false;
+}
+
+void CBarChart::Rebuild() {
+  m_bars->clear();  // deletes the old sets
+  const auto visible = VisibleGroups();
+  double top = 0.0;
+  QStringList labels;
+  for (int g : visible) labels << m_groups[std::size_t(g)].label;
+  for (int s = 0; s < SeriesCount(); ++s) {
+    auto* set = new QBarSet(m_series[std::size_t(s)].legend);
+    const COLORREF c = m_series[std::size_t(s)].color;
+    const QColor color(int(ColorRefRed(c)), int(ColorRefGreen(c)), int(ColorRefBlue(c)));
+    set->setColor(color);
+    set->setBorderColor(color.darker(115));
+    for (int g : visible) {
+      const auto& values = m_groups[std::size_t(g)].values;
+      const double v = std::size_t(s) < values.size() && std::isfinite(values[std::size_t(s)]) ? values[std::size_t(s)] : 0.0;
+      *set << v;
+      top = std::max(top, v);
+    }
+    m_bars->append(set);
+  }
+  m_axisX->clear();
+  // Category texts must be unique: repeated labels get invisible padding.
+  QStringList unique;
+  for (QString l : labels) {
+    while (unique.contains(l)) l += QChar(0x200B);
+    unique << l;
+  }
+  m_axisX->append(unique.isEmpty() ? QStringList{QString()} : unique);
+  double max = top > m_min ? m_min + (top - m_min) * (1.0 + m_headroom / 100.0) : m_min + 1.0;
+  m_axisY->setRange(m_min, max);
+  m_axisY->applyNiceNumbers();
+  if (m_axisY->min() < m_min) m_axisY->setMin(m_min);
+}
+
+void CBarChart::wheelEvent(QWheelEvent* e) {
+  const int steps = e->angleDelta().y() / 120;
+  if (steps) SetScrollPos(m_first - steps);
+  e->accept();
+}

@@ -1,0 +1,97 @@
+#pragma once
+// A bar chart over Qt Charts: several series (legend text and colour each),
+// groups of one bar per series with a label and a tooltip, and a window of a
+// fixed number of groups starting at a scroll position. A scroll bar under the
+// chart (and the wheel) moves the window.
+#include <QString>
+#include <QStringList>
+#include <QWidget>
+#include <string>
+#include <vector>
+
+#include "hostview/Types.h"
+
+class QChart;
+class QChartView;
+class QBarSeries;
+class QBarSet;
+class QBarCategoryAxis;
+class QValueAxis;
+class QScrollBar;
+
+class CBarChart : public QWidget {
+  Q_OBJECT
+ public:
+  struct Group {
+    QString label;             // category text under the bars
+    std::vector<double> values;  // one per series, in series order
+    QString tooltip;           // shown while the pointer is over a bar of the group
+  };
+
+  explicit CBarChart(QWidget* parent = nullptr);
+  ~CBarChart() override;
+
+  // Series, in the order their values appear in every group. Colours are
+  // COLORREF values (0x00BBGGRR).
+  void AddSeries(const QString& legend, COLORREF color);
+  void SetTitle(const QString& title);
+  int SeriesCount() const { return int(m_series.size()); }
+  QString SeriesLegend(int i) const;
+  COLORREF SeriesColor(int i) const;
+
+  void AddGroup(Group group);
+  void SetGroups(std::vector<Group> groups);
+  int GroupCount() const { return int(m_groups.size()); }
+  const Group& GroupAt(int i) const { return m_groups.at(std::size_t(i)); }
+
+  // Number of groups shown at once (ten by default).
+  void SetWindowSize(int groups);
+  int WindowSize() const { return m_window; }
+  // First group shown; clamped to the groups there are.
+  void SetScrollPos(int first);
+  int ScrollPos() const { return m_first; }
+  // The groups in the window (indices into the groups).
+  std::vector<int> VisibleGroups() const;
+
+  // The value axis: it starts at `minimum` and leaves `headroomPercent` of
+  // the largest shown value free above the bars (0 and 20: from zero to 1.2
+  // times the tallest bar). Empty windows show 0 to 1.
+  void SetupRange(double minimum, double headroomPercent);
+  double AxisMin() const;
+  double AxisMax() const;
+
+  // Drops the groups (the series stay).
+  void Clear();
+  // Rebuilds the bars of the window and repaints now.
+  void Redraw();
+  // Tooltip of group `index` (what hovering one of its bars shows).
+  QString TooltipOf(int index) const;
+
+  QChart* Chart() const { return m_chart; }
+  QChartView* View() const { return m_view; }
+
+ protected:
+  void wheelEvent(QWheelEvent* e) override;
+
+ private:
+  struct Series {
+    QString legend;
+    COLORREF color = 0;
+  };
+  void Rebuild();
+  void UpdateScrollBar();
+
+  std::vector<Series> m_series;
+  std::vector<Group> m_groups;
+  int m_window = 10;
+  int m_first = 0;
+  double m_min = 0.0;
+  double m_headroom = 20.0;
+  QChart* m_chart = nullptr;
+  QChartView* m_view = nullptr;
+  QBarSeries* m_bars = nullptr;
+  QBarCategoryAxis* m_axisX = nullptr;
+  QValueAxis* m_axisY = nullptr;
+  QScrollBar* m_scroll = nullptr;
+  bool m_updatingScroll = false;
+};
