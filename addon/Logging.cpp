@@ -1,0 +1,58 @@
+#include "addon/Logging.h"
+
+#include <cstdarg>
+#include <cstdio>
+#include <map>
+#include <vector>
+
+#include "hostview/Services.h"
+
+namespace addon {
+namespace {
+
+std::map<std::wstring, ILogger*, std::less<>>& Loggers() {
+  static std::map<std::wstring, ILogger*, std::less<>> loggers;
+  return loggers;
+}
+
+std::wstring_view Normalised(std::wstring_view name) { return name.empty() ? kUnknownLoggerName : name; }
+
+}  // namespace
+
+void RegisterLogger(std::wstring_view className, ILogger* logger) {
+  const std::wstring key(Normalised(className));
+  if (logger)
+    Loggers()[key] = logger;
+  else
+    Loggers().erase(key);
+}
+
+ILogger* FindLogger(std::wstring_view className) {
+  auto& loggers = Loggers();
+  auto it = loggers.find(Normalised(className));
+  return it == loggers.end() ? nullptr : it->second;
+}
+
+void LogInfo(std::wstring_view className, const char* function, const char* file, int line) {
+  if (ILogger* logger = FindLogger(className))
+    logger->Log(kLogLevel, "Info:%s file:%s line:%d", function ? function : "", file ? file : "", line);
+}
+
+void LogLine(std::wstring_view className, const char* format, ...) {
+  ILogger* logger = FindLogger(className);
+  if (!logger || !format) return;
+  // The host's logger is printf-style but takes no va_list: format here and
+  // hand it over as one "%s" argument.
+  va_list args;
+  va_start(args, format);
+  va_list copy;
+  va_copy(copy, args);
+  const int size = std::vsnprintf(nullptr, 0, format, copy);
+  va_end(copy);
+  std::vector<char> buffer(size > 0 ? static_cast<std::size_t>(size) + 1 : 1, '\0');
+  if (size > 0) std::vsnprintf(buffer.data(), buffer.size(), format, args);
+  va_end(args);
+  logger->Log(kLogLevel, "%s", buffer.data());
+}
+
+}  // namespace addon

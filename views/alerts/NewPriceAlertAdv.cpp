@@ -1,0 +1,30 @@
+#include "views/alerts/NewPriceAlertAdv.h"
+
+ADDON_IMPLEMENT_VIEW(CNewPriceAlertAdv)
+
+const addon::ViewClassInfo& CNewPriceAlertAdv::Info() {
+  static const addon::ViewClassInfo info{
+      "CNewPriceAlertAdv",
+      "NewPriceAlertAdv.cpp",
+      725,
+      L"New Price Alert",
+      {{hm::SystemParameter, "ALEML"}, {hm::SystemParameter, "ALSMS"}, {hm::SystemParameter, "MAXPA"}},
+      {addon::RefStore::Products, addon::RefStore::Instruments},
+  };
+  return info;
+}
+
+CNewPriceAlertAdv::CNewPriceAlertAdv() : CAddonView(Info()) {}
+CNewPriceAlertAdv::~CNewPriceAlertAdv() = default;
+
+void CNewPriceAlertAdv::OnActivate() {
+  m_activeViews.Join(this);
+  PrepareBasicData();
+  SetActiveFlag(true);
+}
+
+void CNewPriceAlertAdv::OnDeactivate() {
+  PrepareBasicData();
+  m_activeViews.Leave();
+  SetActiveFlag(false);
+}
