@@ -9,6 +9,7 @@
 #include <algorithm>
 #include <cmath>
 
+#include "hostview/NumberText.h"
 #include "hostview/StyleRoles.h"
 
 void ApplyEditStyle(QWidget* w, const IStyleManager* sm) {
@@ -130,8 +131,9 @@ void CFloatEdit::SetDecimals(int decimals) {
 void CFloatEdit::SetValue(double value) {
   if (!std::isfinite(value)) { clear(); return; }
   value = std::clamp(value, m_min, m_max);
-  QString t = QString::number(value, 'f', m_decimals);
-  if (t.startsWith(QLatin1Char('-')) && t.toDouble() == 0.0) t.remove(0, 1);
+  // Same rounding as the grids show, without the separators.
+  QString t = QString::fromStdString(Double2Str(value, m_decimals));
+  t.remove(QLatin1Char(','));
   setText(t);
 }
 

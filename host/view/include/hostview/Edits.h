@@ -47,7 +47,8 @@ class HV_API CBranticEdit : public QWidget {
 
 // A decimal number with a fixed number of decimals (0..10). Typing is limited
 // to digits, one "." and the allowed number of decimals; a "-" only when the
-// range allows negatives. Separators are never typed; the value is plain.
+// range allows negatives (the range is 0 to 1e15 until SetRange). Separators
+// are never typed; the value is plain. Values are rounded as Double2Str does.
 class HV_API CFloatEdit : public QLineEdit {
   Q_OBJECT
  public:
