@@ -2,12 +2,23 @@
 
 #include <array>
 
+#include "data/ReferenceStores.h"
 #include "hostview/MessageIds.h"
 
 namespace addon {
 namespace {
+// The stores of data/ that need no view record type are probed from here; the
+// watchlist stores are templates over the price view's record, so the price
+// view installs their probes.
 std::array<StoreProbe, 6>& Probes() {
-  static std::array<StoreProbe, 6> probes{};
+  static std::array<StoreProbe, 6> probes{
+      [] { return ProductMgr().IsLoaded(); },
+      [] { return ExchangeMgr().IsLoaded(); },
+      [] { return InstrumentMgr_ReadOnly().IsLoaded(); },
+      nullptr,
+      nullptr,
+      nullptr,
+  };
   return probes;
 }
 }  // namespace

@@ -1,9 +1,9 @@
 #pragma once
 // Whether a process-wide reference store has been loaded, so that the first
 // PrepareBasicData of a view class asks the host only for what is missing.
-// The stores themselves live in data/ (no Qt, no add-on headers); whoever
-// owns a store installs its probe once (typically from a view's source file
-// at load). A store without a probe counts as not loaded.
+// The product, exchange and instrument stores of data/ are probed by default;
+// the owner of a watchlist store installs its probe (the price view). A store
+// without a probe counts as not loaded.
 #include "hostview/Types.h"
 
 namespace addon {

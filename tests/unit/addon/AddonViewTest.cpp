@@ -1,0 +1,182 @@
+// The shared view behaviour, on a view built in the test and hosted by the
+// scripted host.
+#include <gtest/gtest.h>
+
+#include "addon/AddonView.h"
+#include "addon/TextTables.h"
+#include "mvtest/ScriptedHost.h"
+
+namespace {
+
+class CTestView : public CAddonView {
+ public:
+  CTestView() : CAddonView(Info()) {}
+  static const addon::ViewClassInfo& Info() {
+    static const addon::ViewClassInfo info{
+        "CTestView", "TestView.cpp", 5, L"Test", {{hm::SystemParameter, "MAXWL"}, {hm::NoticeParameter, "WLNOT"}},
+        {addon::RefStore::Products, addon::RefStore::UserWatchlists}};
+    return info;
+  }
+  std::uint32_t OnViewMessage(UINT message, LPARAM data) override {
+    seen.push_back(message);
+    return 0;
+  }
+  std::vector<UINT> seen;
+};
+
+struct AddonViewTest : ::testing::Test {
+  mvtest::ScriptedHost host;
+  CTestView* Make() { return static_cast<CTestView*>(host.Adopt(new CTestView)); }
+};
+
+TEST_F(AddonViewTest, MessageTextLookup_CachesPerKeyAndFallsBackToTheKey) {
+  host.AnswerText("17001, 5", L"Exchange closed");
+  host.AnswerText("17001, 6", L"Other exchange", hm::TextByKey);  // either number may answer
+  CTestView* view = Make();
+
+  EXPECT_EQ(view->LookupMessageText("17001", 5), L"Exchange closed");
+  EXPECT_EQ(view->LookupMessageText("17001", 6), L"Other exchange");
+  EXPECT_EQ(view->LookupMessageText("17001", 5), L"Exchange closed");  // served from the cache
+  auto asked = host.RequestsOf(hm::MessageText);
+  ASSERT_EQ(asked.size(), 2u);
+  EXPECT_EQ(asked[0].text, "17001, 5");
+  EXPECT_EQ(asked[1].text, "17001, 6");
+
+  // No text: the key itself, and not cached (the host is asked again).
+  EXPECT_EQ(view->LookupMessageText("11007"), L"11007, 0");
+  host.AnswerMissingTextsEmpty(true);
+  EXPECT_EQ(view->LookupMessageText("11007"), L"11007, 0");
+  host.AnswerText("11007, 0", L"Quantity is zero");
+  EXPECT_EQ(view->LookupMessageText("11007"), L"Quantity is zero");
+  EXPECT_EQ(host.RequestsOf(hm::MessageText).size(), 5u);
+
+  // The cache is per view.
+  CTestView* other = Make();
+  EXPECT_EQ(other->LookupMessageText("17001", 5), L"Exchange closed");
+  EXPECT_EQ(host.RequestsOf(hm::MessageText).size(), 6u);
+}
+
+TEST_F(AddonViewTest, MessageBox_CaptionedWithAppTitleAndExclamation) {
+  host.appTitle = L"My Terminal";
+  host.AnswerText("17007, 0", L"Cannot trade");
+  CTestView* view = Make();
+  view->ShowMessageText("17007");
+  ASSERT_EQ(host.dialogs.shown.size(), 1u);
+  EXPECT_EQ(host.dialogs.shown[0].caption, QString("My Terminal"));
+  EXPECT_EQ(host.dialogs.shown[0].text, QString("Cannot trade"));
+  EXPECT_EQ(host.dialogs.shown[0].icon, platform::Icon::Exclamation);
+}
+
+TEST_F(AddonViewTest, LinkMode_StoresAndEchoesOnlyZeroOrOne) {
+  CTestView* view = Make();
+  host.Send(view, hm::LinkModeFlag, 1);
+  EXPECT_TRUE(view->LinkMode());
+  host.Send(view, hm::LinkModeFlag, 2);
+  host.Send(view, hm::LinkModeFlag, -1);
+  EXPECT_TRUE(view->LinkMode());
+  host.Send(view, hm::LinkModeFlag, 0);
+  EXPECT_FALSE(view->LinkMode());
+  const auto echoes = host.RequestsOf(hm::LinkModeFlag);
+  ASSERT_EQ(echoes.size(), 2u);
+  EXPECT_EQ(echoes[0].value, 1);
+  EXPECT_EQ(echoes[1].value, 0);
+}
+
+TEST_F(AddonViewTest, AltStatus_OneOrTwoSetsAnythingElseClears) {
+  CTestView* view = Make();
+  host.Send(view, hm::AltStatus, 2);
+  EXPECT_TRUE(view->UsesAltStatus());
+  host.Send(view, hm::AltStatus, 3);
+  EXPECT_FALSE(view->UsesAltStatus());
+  host.Send(view, hm::AltStatus, 1);
+  EXPECT_TRUE(view->UsesAltStatus());
+  host.Send(view, hm::AltStatus, 0);
+  EXPECT_FALSE(view->UsesAltStatus());
+
+  host.AnswerValue(hm::AltStatus, 2);
+  EXPECT_TRUE(view->QueryAltStatus());
+  host.AnswerValue(hm::AltStatus, 7);
+  EXPECT_FALSE(view->QueryAltStatus());
+  EXPECT_EQ(host.RequestsOf(hm::AltStatus).size(), 2u);
+  EXPECT_TRUE(host.RequestsOf(hm::LinkModeFlag).empty());  // answers send nothing
+}
+
+TEST_F(AddonViewTest, DisplayMode_AskedUntilAValidAnswerThenOncePerProcess) {
+  CTestView* first = Make();
+  host.AnswerValue(hm::DisplayMode, 7);  // not a display mode: ignored
+  EXPECT_EQ(first->QueryDisplayMode(), 0);
+  host.AnswerValue(hm::DisplayMode, 101);
+  EXPECT_EQ(first->QueryDisplayMode(), 101);
+  EXPECT_EQ(first->QueryDisplayMode(), 101);
+  CTestView* second = Make();
+  EXPECT_EQ(second->QueryDisplayMode(), 101);
+  const auto asked = host.RequestsOf(hm::DisplayMode);
+  ASSERT_EQ(asked.size(), 2u);
+  EXPECT_EQ(asked[0].value, 1);
+}
+
+TEST_F(AddonViewTest, PrepareBasicData_FirstTimePerClassAsksSettingsThenMissingStores) {
+  host.AnswerSetting(hm::SystemParameter, "MAXWL", "300");
+  host.AnswerSetting(hm::NoticeParameter, "WLNOT", "NYSE,Not allowed");
+  CTestView* view = Make();
+  host.Send(view, hm::Activate);
+  EXPECT_EQ(host.Messages(), (std::vector<UINT>{hm::SystemParameter, hm::NoticeParameter, hm::ProductList,
+                                                hm::WatchlistList}));
+  EXPECT_EQ(host.Requests()[0].text, "MAXWL");
+  EXPECT_EQ(host.Requests()[1].text, "WLNOT");
+  EXPECT_EQ(host.Requests()[2].value, 0);
+  EXPECT_EQ(addon::SettingTextTable::Instance().MaxWatchlistItems(), 300);
+  EXPECT_EQ(addon::SettingTextTable::Instance().Get("WLNOT"), L"NYSE,Not allowed");
+  EXPECT_TRUE(view->IsActive());
+
+  host.ClearRequests();
+  host.Send(view, hm::Deactivate);
+  host.Send(Make(), hm::Activate);
+  EXPECT_TRUE(host.Requests().empty());  // later runs of the class ask nothing
+
+  // Logged at the start and the end, under the class name.
+  const auto lines = host.logs.Texts();
+  ASSERT_GE(lines.size(), 2u);
+  EXPECT_EQ(lines[0].rfind("Info:CTestView::PrepareBasicData file:TestView.cpp line:", 0), 0u) << lines[0];
+  EXPECT_EQ(host.logs.lines[0].level, 3);
+}
+
+TEST_F(AddonViewTest, SettingAnswers_WithoutAPendingRequestAreNotFiled) {
+  CTestView* view = Make();
+  host.SendNarrow(view, hm::SystemParameter, "123");
+  EXPECT_FALSE(addon::SettingTextTable::Instance().Has(""));
+  EXPECT_FALSE(view->RequestSetting(hm::SystemParameter, "MAXWT"));  // host silent
+  host.AnswerSetting(hm::SystemParameter, "MAXWT", "9");
+  EXPECT_TRUE(view->RequestSetting(hm::SystemParameter, "MAXWT"));
+  EXPECT_EQ(addon::SettingTextTable::Instance().MaxWatchlists(), 9);
+}
+
+TEST_F(AddonViewTest, Title_FromLanguageEntryElseDefault) {
+  CTestView* view = Make();
+  view->ApplyLanguage();
+  host.language.Set(13, 5, L"Tested");
+  view->ApplyLanguage();
+  const auto titles = host.RequestsOf(hm::Title);
+  ASSERT_EQ(titles.size(), 2u);
+  EXPECT_EQ(titles[0].wtext, L"Test");
+  EXPECT_EQ(titles[1].wtext, L"Tested");
+  EXPECT_EQ(view->GetTitle(), L"Tested");
+}
+
+TEST_F(AddonViewTest, Mend_NullPointersAndUnknownNumbersChangeNothing) {
+  CTestView* view = Make();
+  host.Send(view, hm::LinkModeFlag, 1);
+  host.ClearRequests();
+  for (UINT message : {hm::LinkData, hm::FieldValue, hm::RequestField, hm::InstrumentList, hm::ExchangeList,
+                       hm::ProductList, hm::TextByKey, hm::SystemParameter, hm::NoticeParameter, hm::MessageText,
+                       hm::LinkedInstrument, hm::MarketInfo, hm::PriceBands})
+    EXPECT_EQ(host.Send(view, message, 0), 0u) << message;
+  EXPECT_TRUE(view->seen.empty());  // dropped before the view's own handler
+  for (UINT message : {0u, 3u, 9999u, 0xFFFFFFFFu}) host.Send(view, message, 0);
+  EXPECT_EQ(view->seen, (std::vector<UINT>{0u, 3u, 9999u, 0xFFFFFFFFu}));
+  EXPECT_TRUE(host.Requests().empty());
+  EXPECT_TRUE(view->LinkMode());
+  EXPECT_TRUE(view->LastMessageText().empty());
+}
+
+}  // namespace
