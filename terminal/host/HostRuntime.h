@@ -94,7 +94,8 @@ struct HostStats {
   std::uint64_t answers = 0;       // 412 delivered
   std::uint64_t requests = 0;      // requests received
   std::uint64_t subscriptions = 0; // live subscriptions
-  std::uint64_t malformedTexts = 0;
+  std::uint64_t malformedTexts = 0;  // watchlist texts refused
+  std::uint64_t alertsFired = 0;
 };
 
 class HostRuntime : public IViewHost {
@@ -150,6 +151,8 @@ class HostRuntime : public IViewHost {
   ILogFactory& LogFactory();
   IMenuManager& Menus();
   HostSettings& Settings();
+  // Changes a setting, saves it in the store and tells every view (2600).
+  void SaveSetting(const std::string& key, const std::string& value);
   sim::Market& Market();
   // Text of a message code ("17001"); empty when unknown.
   std::wstring MessageText(const std::string& code) const;

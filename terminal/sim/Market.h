@@ -132,8 +132,10 @@ class Market {
   std::vector<int> TakeChanged();
 
   // ---- Values ---------------------------------------------------------------------
-  const Quote& QuoteOf(int index);
+  Quote QuoteOf(int index);
   DepthLevel Depth(int index, int level);   // level 1..99
+  // Levels 1..`levels` in one pass (what a depth subscription reads).
+  std::vector<DepthLevel> Book(int index, int levels);
   const std::vector<Trade>& Trades(int index);
   std::vector<SummaryLine> Summary(int index);  // by price, highest first
 
