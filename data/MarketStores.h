@@ -11,6 +11,8 @@
 #include <array>
 
 #include "data/CellStore.h"
+#include "hostview/Records.h"
+#include "hostview/Text.h"
 
 namespace mvd {
 constexpr CellSpec PriceCell(std::wstring_view n, int decimals = 3) {
@@ -122,3 +124,9 @@ extern template class CellStore<SalesSummaryLayout>;
 extern template class CellStore<SalesPageLayout>;
 extern template class CellStore<SummaryHeaderLayout>;
 extern template class CellStore<SummaryLineLayout>;
+
+// Terminal field values (410/412) into the stores, texts widened. The caller
+// checks kind, level and page first.
+inline bool ApplyFieldUpdate(DepthStore& store, const FieldUpdate& u, std::uint32_t now) {
+  return store.Update(DepthKey{u.productId, hv::Widen(u.instrumentCode), u.param}, hv::Widen(u.fieldName), hv::Widen(u.value), now);
+}

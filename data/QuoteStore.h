@@ -9,6 +9,8 @@
 #include <array>
 
 #include "data/CellStore.h"
+#include "hostview/Records.h"
+#include "hostview/Text.h"
 
 namespace mvd {
 constexpr CellSpec QuotePrice(std::wstring_view n, std::wstring_view def = L"0.000", bool raw = false) {
@@ -57,3 +59,10 @@ using QuoteRecord = CellRecord<QuoteLayout>;
 using QuoteStore = CellStore<QuoteLayout>;
 
 extern template class CellStore<QuoteLayout>;
+
+// Writes a terminal field value (410/412) into `store`: code, name and value
+// widened (invalid UTF-8 becomes U+FFFD). Which updates belong to the view
+// (kind, param, page) is the caller's check.
+inline bool ApplyFieldUpdate(QuoteStore& store, const FieldUpdate& u, std::uint32_t now) {
+  return store.Update(InstrumentKey{u.productId, hv::Widen(u.instrumentCode)}, hv::Widen(u.fieldName), hv::Widen(u.value), now);
+}

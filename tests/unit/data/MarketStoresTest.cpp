@@ -186,3 +186,18 @@ TEST(MarketDelayCache_Lookup, MissIsEmptyAndZeroDelayIsAnEmptyHit) {
   c.Set(1, L"XSES", L"20 min");
   EXPECT_EQ(c.Lookup(1, L"XSES"), L"20 min");
 }
+
+TEST_F(DepthStoreTest, ApplyFieldUpdate_LevelFromParamAndInvalidUtf8Code) {
+  const std::string code("D\xffX", 3);
+  const DepthKey k{4, L"D\uFFFDX", 7};
+  store_.Get(k, 0);
+  FieldUpdate u;
+  u.productId = 4;
+  u.instrumentCode = code;
+  u.fieldName = "SVOL";
+  u.value = "1,500";
+  u.param = 7;
+  u.kind = 1;
+  EXPECT_TRUE(ApplyFieldUpdate(store_, u, 3));
+  EXPECT_EQ(store_.Get(k, 4)[DepthLayout::SVol].text, L"1500");
+}

@@ -215,3 +215,14 @@ TEST(QuoteStore_Instance, OneStorePerProcess) {
   QuoteStore::Instance().Get(kA, 0);
   EXPECT_EQ(QuoteStore::Instance().PendingCount(), 1u);
 }
+
+TEST_F(QuoteStoreTest, ApplyFieldUpdate_WidensTerminalText) {
+  store_.Get(InstrumentKey{1, L"Q\uFFFD"}, 0);
+  FieldUpdate u;
+  u.productId = 1;
+  u.instrumentCode = "Q\xc3";  // truncated sequence
+  u.fieldName = "REMARKS";
+  u.value = "caf\xc3\xa9 \xff ok";
+  EXPECT_TRUE(ApplyFieldUpdate(store_, u, 5));
+  EXPECT_EQ(store_.Get(InstrumentKey{1, L"Q\uFFFD"}, 6)[Q::Remarks].text, L"caf\u00e9 \uFFFD ok");
+}
