@@ -1,0 +1,104 @@
+#pragma once
+// The terminal's main window: every view lives in a dock of its own that can be
+// tabbed with others, floated and docked again. The window knows views only as
+// CSuperBaseView; what to do with them is the application's business (signals).
+#include <QDockWidget>
+#include <QMainWindow>
+#include <QPointer>
+#include <vector>
+
+class CSuperBaseView;
+class QActionGroup;
+class QMenu;
+class QMimeData;
+
+namespace term {
+
+// Mime type of an instrument drag between docks: the wide JSON link text as UTF-8.
+inline constexpr const char* kLinkMimeType = "application/x-marketviews-link";
+// Mime type carrying the dragging view's class name.
+inline constexpr const char* kSourceMimeType = "application/x-marketviews-source";
+
+class ViewDock : public QDockWidget {
+  Q_OBJECT
+ public:
+  ViewDock(CSuperBaseView* view, const QString& className, int instance, QWidget* parent);
+  CSuperBaseView* View() const { return m_view; }
+  const QString& ClassName() const { return m_className; }
+  int Instance() const { return m_instance; }
+
+ signals:
+  void closing(ViewDock* dock);
+  void dropped(ViewDock* dock, const QString& sourceClass, const QString& link);
+
+ protected:
+  void closeEvent(QCloseEvent* event) override;
+  void dragEnterEvent(QDragEnterEvent* event) override;
+  void dragMoveEvent(QDragMoveEvent* event) override;
+  void dropEvent(QDropEvent* event) override;
+
+ private:
+  bool Accepts(const QMimeData* mime) const;
+  QPointer<CSuperBaseView> m_view;
+  QString m_className;
+  int m_instance;
+};
+
+class MainWindow : public QMainWindow {
+  Q_OBJECT
+ public:
+  struct Style {
+    int id;
+    QString name;
+  };
+  // `classNames`: what the View menu offers; `styles`: the style switch.
+  MainWindow(const QStringList& addonClasses, const QStringList& terminalClasses, const std::vector<Style>& styles,
+             int currentStyle);
+  ~MainWindow() override;
+
+  // Puts a created view into a new dock (tabbed with a dock of the same class
+  // when there is one). `objectName` restores a saved dock; empty makes a new one.
+  ViewDock* AddView(CSuperBaseView* view, const QString& className, const QString& objectName = {});
+  // Docks in opening order.
+  std::vector<ViewDock*> Docks() const;
+  ViewDock* DockOf(const CSuperBaseView* view) const;
+  void SetViewTitle(CSuperBaseView* view, const QString& title);
+  // Makes `view` the active one (raises its tab); emits activationChanged as needed.
+  void ActivateView(CSuperBaseView* view);
+  CSuperBaseView* ActiveView() const;
+  // Closes and deletes every dock (the views die with them).
+  void CloseAllViews();
+  // Tells the user something without stopping the program (status bar + log).
+  void ShowNotice(const QString& text);
+
+ signals:
+  void openRequested(const QString& className);
+  void activationChanged(CSuperBaseView* view, bool active);
+  void viewClosing(CSuperBaseView* view);
+  void styleRequested(int styleId);
+  void languageReloadRequested();
+  void fontSizeRequested();
+  void settingsRequested();
+  void saveLayoutRequested();
+  void dropRequested(CSuperBaseView* target, const QString& sourceClass, const QString& link);
+  void closingWindow();
+
+ protected:
+  bool eventFilter(QObject* watched, QEvent* event) override;
+  void closeEvent(QCloseEvent* event) override;
+
+ private:
+  void BuildMenus(const QStringList& addonClasses, const QStringList& terminalClasses, const std::vector<Style>& styles,
+                  int currentStyle);
+  void OnFocusChanged(QWidget* old, QWidget* now);
+  void SetActiveDock(ViewDock* dock);
+  void OnDockClosing(ViewDock* dock);
+  ViewDock* DockAt(QObject* o) const;
+
+  std::vector<QPointer<ViewDock>> m_docks;
+  QPointer<ViewDock> m_active;
+  QMenu* m_windowMenu = nullptr;
+  bool m_closingAll = false;
+};
+
+}  // namespace term

@@ -1,0 +1,170 @@
+#include "terminal/app/Options.h"
+
+#include <charconv>
+#include <cstring>
+#include <limits>
+
+namespace term {
+
+namespace {
+
+template <typename T>
+bool ParseNumber(const std::string& text, T& out) {
+  const char* end = text.data() + text.size();
+  auto [p, ec] = std::from_chars(text.data(), end, out);
+  return ec == std::errc() && p == end && !text.empty();
+}
+
+bool ParseOpen(const std::string& text, OpenRequest& out, std::string& error) {
+  // CLASS or CLASS:PRODUCTID:CODE. The code may itself hold ':'.
+  const auto first = text.find(':');
+  out.className = text.substr(0, first);
+  if (out.className.empty()) {
+    error = "--open needs a class name, as in --open CMarketDepthAdv:1:D05";
+    return false;
+  }
+  if (first == std::string::npos) return true;
+  const auto second = text.find(':', first + 1);
+  if (second == std::string::npos) {
+    error = "--open " + text + ": write CLASS or CLASS:PRODUCTID:CODE";
+    return false;
+  }
+  if (!ParseNumber(text.substr(first + 1, second - first - 1), out.productId) || out.productId < 0) {
+    error = "--open " + text + ": the product id must be a whole number";
+    return false;
+  }
+  out.instrumentCode = text.substr(second + 1);
+  if (out.instrumentCode.empty()) {
+    error = "--open " + text + ": the instrument code is missing";
+    return false;
+  }
+  return true;
+}
+
+}  // namespace
+
+bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
+  for (int i = 1; i < argc; ++i) {
+    std::string arg = argv[i];
+    std::string inlineValue;
+    bool hasInline = false;
+    if (arg.rfind("--", 0) == 0) {
+      if (const auto eq = arg.find('='); eq != std::string::npos) {
+        inlineValue = arg.substr(eq + 1);
+        arg.resize(eq);
+        hasInline = true;
+      }
+    }
+    auto value = [&](std::string& out) -> bool {
+      if (hasInline) { out = inlineValue; return true; }
+      if (i + 1 >= argc) { error = arg + " needs a value"; return false; }
+      out = argv[++i];
+      return true;
+    };
+    auto number = [&](auto& out, long long min, long long max) -> bool {
+      std::string text;
+      if (!value(text)) return false;
+      long long n = 0;
+      if (!ParseNumber(text, n) || n < min || n > max) {
+        error = arg + ": expected a whole number from " + std::to_string(min) + " to " + std::to_string(max) +
+                ", got \"" + text + "\"";
+        return false;
+      }
+      out = static_cast<std::remove_reference_t<decltype(*out)>>(n);
+      return true;
+    };
+    if (arg == "-h" || arg == "--help") o.help = true;
+    else if (arg == "--version") o.version = true;
+    else if (arg == "--headless") o.headless = true;
+    else if (arg == "-v" || arg == "--verbose") o.verbose = true;
+    else if (arg == "--no-restore") o.restoreLayout = false;
+    else if (arg == "--seconds") {
+      std::string text;
+      if (!value(text)) return false;
+      double s = 0;
+      if (!ParseNumber(text, s) || !(s >= 0) || s > 1e7) {
+        error = "--seconds: expected a number of simulated seconds, got \"" + text + "\"";
+        return false;
+      }
+      o.seconds = s;
+    } else if (arg == "--seed") {
+      std::string text;
+      if (!value(text)) return false;
+      std::uint64_t s = 0;
+      if (!ParseNumber(text, s)) { error = "--seed: expected a whole number, got \"" + text + "\""; return false; }
+      o.seed = s;
+    } else if (arg == "--instruments") {
+      if (!number(o.instruments, 1, 500000)) return false;
+    } else if (arg == "--rate") {
+      if (!number(o.rate, 0, 10000000)) return false;
+    } else if (arg == "--open") {
+      std::string text;
+      if (!value(text)) return false;
+      OpenRequest r;
+      if (!ParseOpen(text, r, error)) return false;
+      o.open.push_back(std::move(r));
+    } else if (arg == "--snapshot") {
+      if (!value(o.snapshotDir)) return false;
+    } else if (arg == "--dump") {
+      if (!value(o.dumpDir)) return false;
+    } else if (arg == "--addon") {
+      if (!value(o.addonPath)) return false;
+    } else if (arg == "--data-dir") {
+      if (!value(o.dataDir)) return false;
+    } else if (arg == "--list-instruments") {
+      // The count is optional: take the next word only when it is a number.
+      if (hasInline) {
+        if (!number(o.listInstruments, 0, std::numeric_limits<int>::max())) return false;
+      } else if (i + 1 < argc && argv[i + 1][0] != '-') {
+        if (!number(o.listInstruments, 0, std::numeric_limits<int>::max())) return false;
+      } else {
+        o.listInstruments = 0;
+      }
+    } else {
+      error = "unknown option \"" + std::string(argv[i]) + "\" (see --help)";
+      return false;
+    }
+  }
+  if ((!o.snapshotDir.empty() || !o.dumpDir.empty()) && !o.seconds && !o.headless) {
+    // Snapshots and dumps are taken at the end of a timed run.
+    error = "--snapshot and --dump need --seconds N (or --headless)";
+    return false;
+  }
+  return true;
+}
+
+std::string UsageText(const char* program) {
+  std::string p = program ? program : "terminal";
+  return "Usage: " + p + R"( [options]
+
+The trading terminal with its simulated market. It loads the market views add-on
+and shows each view in a dock; the layout is restored from the last session.
+
+Options:
+  --addon PATH            the add-on library (default: libmarketviews.so in ../lib
+                          next to the executable)
+  --data-dir DIR          where settings, watchlists, alerts, layout and logs live
+                          (default: $XDG_DATA_HOME/marketviews-terminal)
+  --open CLASS[:PRODUCTID:CODE]
+                          open a view, optionally on an instrument (repeatable);
+                          classes: CPriceViewAdv CMarketDepthAdv CTimeAndSalesAdv
+                          CTradeSummaryAdv CPriceAlertList CNewPriceAlertAdv
+                          CTradeView CBranticChartView CInsExpViewEx
+                          CStockAnalytics CFNews
+  --no-restore            do not reopen the saved layout
+  --headless              no window system (Qt offscreen) and a virtual clock
+  --seconds N             run N simulated seconds as fast as possible, then save
+                          and exit (without it, a headless run lasts 10 seconds)
+  --seed N                seed of the simulated market (same seed, same market)
+  --instruments N         number of simulated instruments (1 to 500000)
+  --rate N                simulated field updates per second
+  --snapshot DIR          at the end, write a PNG of the main window and of each view
+  --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv
+  --list-instruments [N]  print the first N simulated instruments (all without N):
+                          product id, instrument code, exchange code, name
+  -v, --verbose           also print the views' log lines
+  -h, --help              this text
+)";
+}
+
+}  // namespace term

@@ -1,0 +1,41 @@
+#pragma once
+// The terminal's command line.
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace term {
+
+// One --open: a class name, optionally with the instrument it starts on.
+struct OpenRequest {
+  std::string className;
+  std::int64_t productId = -1;
+  std::string instrumentCode;  // empty: none
+};
+
+struct Options {
+  bool help = false;
+  bool version = false;
+  bool headless = false;
+  bool verbose = false;             // also show the views' log lines on stderr
+  bool restoreLayout = true;        // --no-restore: start without the saved layout
+  std::optional<double> seconds;    // simulated seconds to run, as fast as possible
+  std::optional<std::uint64_t> seed;
+  std::optional<int> instruments;
+  std::optional<int> rate;          // field updates per second
+  std::vector<OpenRequest> open;
+  std::string snapshotDir;
+  std::string dumpDir;
+  std::optional<int> listInstruments;  // set: print the first N instruments and exit (0: all)
+  std::string addonPath;
+  std::string dataDir;
+};
+
+// Parses argv. On a bad command line returns false with a one-line `error`.
+bool ParseOptions(int argc, char** argv, Options& options, std::string& error);
+
+// The --help text.
+std::string UsageText(const char* program);
+
+}  // namespace term

@@ -1,0 +1,34 @@
+#pragma once
+// The host settings the views read: quote-grid columns and font size, keyboard
+// shortcuts, the alert list's filter option and the order-number display.
+#include <QDialog>
+#include <string>
+
+#include "hostconfig/UserSettings.h"
+
+class QCheckBox;
+class QComboBox;
+class QListWidget;
+
+namespace term {
+
+class SettingsDialog : public QDialog {
+  Q_OBJECT
+ public:
+  // Shows the current values of GetUserSettings().
+  explicit SettingsDialog(QWidget* parent = nullptr);
+  // Writes the dialog's values into `settings` (each group stored at once).
+  // False with `problem` when the storage refused a group (the values still apply).
+  bool Apply(CUserSettings& settings, std::string& problem) const;
+
+ private:
+  void Move(int delta);
+  CWatchlistSetting m_watchlist;
+  QListWidget* m_columns = nullptr;
+  QComboBox* m_font = nullptr;
+  QCheckBox* m_shortcuts = nullptr;
+  QComboBox* m_alertFilter = nullptr;
+  QCheckBox* m_orderNumbers = nullptr;
+};
+
+}  // namespace term

@@ -1,0 +1,87 @@
+#pragma once
+// Wires the terminal together: the add-on, the host runtime and its simulated
+// market, the SQLite store, the main window with its docks, and (headless) the
+// virtual-clock run with its snapshots and dumps.
+#include <QObject>
+#include <QPointer>
+#include <QTimer>
+#include <memory>
+#include <string>
+
+#include "terminal/app/Options.h"
+#include "terminal/host/HostRuntime.h"
+
+class CSuperBaseView;
+struct CRuntimeClass;
+
+namespace term {
+
+class AddonLoader;
+class MainWindow;
+class SqliteHostStore;
+class Store;
+class ViewDock;
+
+class TerminalApp : public QObject, public IHostShell {
+  Q_OBJECT
+ public:
+  // `store` may be null (nothing persists). Both must outlive the application.
+  TerminalApp(const Options& options, AddonLoader& addon, Store* store);
+  ~TerminalApp() override;
+
+  // Builds the runtime and the window, restores the layout and opens --open.
+  bool Start(std::string& error);
+  // Headless or --seconds: runs the simulated seconds, writes dumps and
+  // snapshots, saves. Returns the process exit code.
+  int RunTimed();
+  // Saves the layout and closes every view (idempotent).
+  void Shutdown();
+
+  MainWindow& Window() { return *m_window; }
+  HostRuntime& Runtime() { return *m_runtime; }
+
+  // The descriptor for a class name: the add-on's, else the terminal's own.
+  const CRuntimeClass* FindClass(const std::string& className) const;
+  // Creates a view in a new dock; null with `error` when the class is unknown or
+  // creates nothing. `objectName` restores a saved dock.
+  CSuperBaseView* OpenView(const std::string& className, std::int64_t productId, const std::string& code,
+                           const StartParamMap& params, const QString& objectName, std::string& error);
+  bool SaveLayout();
+  // Restores the saved layout; returns the number of views reopened.
+  int RestoreLayout();
+
+  // Writes <dir>/<Class>-<n>.tsv for every view; returns the number of files.
+  int DumpGrids(const std::string& dir, std::string& error);
+  // Writes <dir>/terminal.png and <dir>/<Class>-<n>.png; returns the number of files.
+  int Snapshot(const std::string& dir, std::string& error);
+
+  // ---- IHostShell ----
+  CSuperBaseView* OpenView(const std::wstring& className, CSuperBaseView* requester) override;
+  void ForeignLink(const std::wstring& className, const std::wstring& linkText, CSuperBaseView* requester) override;
+  void ShowNotice(const std::wstring& title, const std::wstring& text) override;
+  void ViewTitleChanged(CSuperBaseView* view, const std::wstring& title) override;
+  void ViewSizeRequested(CSuperBaseView* view, int width, int height) override;
+
+ private:
+  void OnActivation(CSuperBaseView* view, bool active);
+  void OnDrop(CSuperBaseView* target, const QString& source, const QString& link);
+  void OpenFromMenu(const QString& className);
+  void ShowSettings();
+  void ShowFontSize();
+  void ChangeStyle(int styleId);
+  void Progress(const std::string& line) const;
+  void OpenDefaultLayout();
+  void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
+
+  Options m_options;
+  AddonLoader& m_addon;
+  Store* m_store;
+  std::unique_ptr<SqliteHostStore> m_hostStore;
+  std::unique_ptr<HostRuntime> m_runtime;
+  std::unique_ptr<MainWindow> m_window;
+  QTimer m_pump;
+  bool m_shutDown = false;
+  int m_styleId = 1;
+};
+
+}  // namespace term

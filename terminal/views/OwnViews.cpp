@@ -1,0 +1,540 @@
+#include "terminal/views/OwnViews.h"
+
+#include <QApplication>
+#include <QChart>
+#include <QChartView>
+#include <QComboBox>
+#include <QDateTime>
+#include <QDateTimeAxis>
+#include <QDoubleSpinBox>
+#include <QDrag>
+#include <QFormLayout>
+#include <QHBoxLayout>
+#include <QHeaderView>
+#include <QLabel>
+#include <QLineEdit>
+#include <QLineSeries>
+#include <QMimeData>
+#include <QMouseEvent>
+#include <QPushButton>
+#include <QSpinBox>
+#include <QStandardItemModel>
+#include <QTableView>
+#include <QTableWidget>
+#include <QValueAxis>
+#include <QVBoxLayout>
+#include <cmath>
+
+#include "terminal/host/HostRuntime.h"
+#include "terminal/sim/Market.h"
+
+namespace term::views {
+
+namespace {
+
+sim::Market* MarketOrNull() { return Runtime() ? &Runtime()->Market() : nullptr; }
+
+const JInstrumentUnderlying* InstrumentAt(int index) {
+  sim::Market* m = MarketOrNull();
+  if (!m || index < 0 || static_cast<std::size_t>(index) >= m->Instruments().size()) return nullptr;
+  return &m->Instruments()[static_cast<std::size_t>(index)];
+}
+
+QString Price(int index, double value) {
+  if (value == 0) return QStringLiteral("-");
+  return QString::fromStdString(MarketOrNull()->FormatPrice(index, value));
+}
+
+QString Grouped(std::int64_t n) { return QLocale(QLocale::English).toString(static_cast<qlonglong>(n)); }
+
+QString JsonEscape(const std::string& s) {
+  QString out;
+  for (QChar c : QString::fromStdString(s)) {
+    if (c == '"' || c == '\\') out += '\\', out += c;
+    else if (c.unicode() < 0x20) out += QString("\\u%1").arg(c.unicode(), 4, 16, QChar('0'));
+    else out += c;
+  }
+  return out;
+}
+
+QTableWidget* MakeTable(const QStringList& headings, QWidget* parent) {
+  auto* t = new QTableWidget(0, static_cast<int>(headings.size()), parent);
+  t->setHorizontalHeaderLabels(headings);
+  t->verticalHeader()->hide();
+  t->setEditTriggers(QAbstractItemView::NoEditTriggers);
+  t->setSelectionBehavior(QAbstractItemView::SelectRows);
+  t->horizontalHeader()->setStretchLastSection(true);
+  return t;
+}
+
+void SetRow(QTableWidget* t, int row, const QStringList& cells) {
+  for (int c = 0; c < cells.size(); ++c) {
+    auto* item = t->item(row, c);
+    if (!item) t->setItem(row, c, item = new QTableWidgetItem);
+    if (item->text() != cells[c]) item->setText(cells[c]);
+  }
+}
+
+}  // namespace
+
+std::vector<BlotterOrder>& Blotter() {
+  static std::vector<BlotterOrder> orders;
+  return orders;
+}
+
+// ---- Trade ticket -----------------------------------------------------------
+
+void CTradeView::Build() {
+  auto* layout = new QVBoxLayout(this);
+  auto* form = new QFormLayout;
+  m_instrumentLabel = new QLabel(this);
+  m_quoteLabel = new QLabel(this);
+  m_side = new QComboBox(this);
+  m_side->addItems({"Buy", "Sell"});
+  m_price = new QDoubleSpinBox(this);
+  m_price->setRange(0, 1e9);
+  m_quantity = new QSpinBox(this);
+  m_quantity->setRange(0, 1000000000);
+  m_type = new QComboBox(this);
+  m_type->addItems({"Limit", "Market"});
+  m_validity = new QComboBox(this);
+  m_validity->addItems({"Day", "Good till cancelled", "Fill and kill"});
+  m_trigger = new QLabel("-", this);
+  form->addRow("Instrument", m_instrumentLabel);
+  form->addRow("Quote", m_quoteLabel);
+  form->addRow("Side", m_side);
+  form->addRow("Price", m_price);
+  form->addRow("Quantity", m_quantity);
+  form->addRow("Order type", m_type);
+  form->addRow("Validity", m_validity);
+  form->addRow("Trigger", m_trigger);
+  layout->addLayout(form);
+  auto* row = new QHBoxLayout;
+  m_place = new QPushButton("Place order", this);
+  m_message = new QLabel(this);
+  row->addWidget(m_place);
+  row->addWidget(m_message, 1);
+  layout->addLayout(row);
+  m_blotter = MakeTable({"No.", "Time", "Side", "Instrument", "Quantity", "Price", "Type", "Validity", "Status"}, this);
+  m_blotter->setObjectName("blotter");
+  layout->addWidget(m_blotter, 1);
+  connect(m_place, &QPushButton::clicked, this, [this] { PlaceOrder(); });
+  connect(m_type, &QComboBox::currentTextChanged, this, [this](const QString& t) { m_price->setEnabled(t != "Market"); });
+}
+
+void CTradeView::InstrumentChanged() {
+  const auto* ins = InstrumentAt(m_instrument);
+  m_instrumentLabel->setText(ins ? InstrumentLabel() + " (" + QString::fromStdString(ins->exchangeCode) + ")"
+                                 : QStringLiteral("(none)"));
+  if (!ins) return;
+  m_price->setDecimals(std::clamp(ins->decimals, 0, 8));
+  m_quantity->setSingleStep(static_cast<int>(std::max<std::int64_t>(1, ins->lotSize)));
+  if (m_quantity->value() == 0) m_quantity->setValue(static_cast<int>(std::max<std::int64_t>(1, ins->lotSize)));
+  if (m_price->value() == 0) {
+    const auto& q = MarketOrNull()->QuoteOf(m_instrument);
+    m_price->setValue(m_side->currentText() == "Buy" ? q.ask : q.bid);
+  }
+}
+
+void CTradeView::TakeLink(const std::map<std::string, std::string>& link) {
+  auto get = [&](const char* key) -> QString {
+    const auto it = link.find(key);
+    return it == link.end() ? QString() : QString::fromStdString(it->second);
+  };
+  if (const QString side = get("Field_side"); side.compare("Sell", Qt::CaseInsensitive) == 0) m_side->setCurrentIndex(1);
+  else if (side.compare("Buy", Qt::CaseInsensitive) == 0) m_side->setCurrentIndex(0);
+  bool ok = false;
+  if (const double p = get("Field_Trade_price").toDouble(&ok); ok && p > 0) m_price->setValue(p);
+  else m_price->setValue(0);  // taken from the quote once the instrument is known
+  if (const qlonglong q = get("Field_qty").toLongLong(&ok); ok && q > 0) m_quantity->setValue(static_cast<int>(q));
+  if (const QString type = get("Field_Order_type"); !type.isEmpty()) {
+    if (m_type->findText(type) < 0) m_type->addItem(type);
+    m_type->setCurrentText(type);
+  }
+  if (const QString validity = get("Field_Order_validity"); !validity.isEmpty()) {
+    if (m_validity->findText(validity) < 0) m_validity->addItem(validity);
+    m_validity->setCurrentText(validity);
+  }
+  const QString trigger = get("Field_Trigger_type");
+  m_trigger->setText(trigger.isEmpty() ? QStringLiteral("-") : trigger);
+}
+
+void CTradeView::Refresh() {
+  if (const auto* ins = InstrumentAt(m_instrument)) {
+    const auto& q = MarketOrNull()->QuoteOf(m_instrument);
+    m_quoteLabel->setText(QString("Bid %1  Ask %2  Last %3")
+                              .arg(Price(m_instrument, q.bid), Price(m_instrument, q.ask), Price(m_instrument, q.last)));
+    (void)ins;
+  } else {
+    m_quoteLabel->setText("-");
+  }
+  // Working orders fill once the market reaches them.
+  if (sim::Market* m = MarketOrNull()) {
+    for (auto& o : Blotter()) {
+      if (o.status != "Working") continue;
+      const int index = m->FindByCode(o.code.toStdString());
+      if (index < 0) continue;
+      const auto& q = m->QuoteOf(index);
+      if ((o.side == "Buy" && q.ask > 0 && q.ask <= o.price) || (o.side == "Sell" && q.bid > 0 && q.bid >= o.price))
+        o.status = "Filled";
+    }
+  }
+  FillBlotter();
+}
+
+void CTradeView::PlaceOrder() {
+  const auto* ins = InstrumentAt(m_instrument);
+  if (!ins) { m_message->setText("Choose an instrument first."); return; }
+  if (ins->accessStatus != 3) { m_message->setText("This instrument cannot be traded."); return; }
+  const qint64 qty = m_quantity->value();
+  const qint64 lot = std::max<std::int64_t>(1, ins->lotSize);
+  if (qty <= 0 || qty % lot != 0) {
+    m_message->setText(QString("The quantity must be a multiple of the lot size %1.").arg(Grouped(lot)));
+    return;
+  }
+  if (ins->maxQty1 > 0 && qty > ins->maxQty1) {
+    m_message->setText(QString("The quantity exceeds the maximum of %1.").arg(Grouped(ins->maxQty1)));
+    return;
+  }
+  const auto& q = MarketOrNull()->QuoteOf(m_instrument);
+  const bool buy = m_side->currentIndex() == 0;
+  const bool market = m_type->currentText() == "Market";
+  const double touch = buy ? q.ask : q.bid;
+  if (!market && m_price->value() <= 0) { m_message->setText("Enter a price."); return; }
+  BlotterOrder o;
+  o.number = static_cast<int>(Blotter().size()) + 1;
+  o.time = QString::fromStdString(MarketOrNull()->TimeText());
+  o.side = buy ? "Buy" : "Sell";
+  o.code = QString::fromStdString(ins->instrumentCode);
+  o.quantity = qty;
+  o.type = m_type->currentText();
+  o.validity = m_validity->currentText();
+  o.trigger = m_trigger->text();
+  const bool marketable = touch > 0 && (market || (buy ? m_price->value() >= touch : m_price->value() <= touch));
+  o.price = marketable ? touch : m_price->value();
+  o.status = marketable ? "Filled" : (m_validity->currentText() == "Fill and kill" ? "Cancelled" : "Working");
+  Blotter().push_back(o);
+  m_message->setText(QString("Order %1 %2.").arg(o.number).arg(o.status.toLower()));
+  FillBlotter();
+}
+
+void CTradeView::FillBlotter() {
+  const auto& orders = Blotter();
+  m_blotter->setRowCount(static_cast<int>(orders.size()));
+  for (std::size_t i = 0; i < orders.size(); ++i) {
+    const auto& o = orders[orders.size() - 1 - i];  // newest first
+    const int index = MarketOrNull() ? MarketOrNull()->FindByCode(o.code.toStdString()) : -1;
+    SetRow(m_blotter, static_cast<int>(i),
+           {QString::number(o.number), o.time, o.side, o.code, Grouped(o.quantity),
+            index >= 0 ? Price(index, o.price) : QString::number(o.price), o.type, o.validity, o.status});
+  }
+  m_shownOrders = orders.size();
+}
+
+// ---- Chart ------------------------------------------------------------------
+
+void CChartView::Build() {
+  auto* layout = new QVBoxLayout(this);
+  layout->setContentsMargins(0, 0, 0, 0);
+  auto* chart = new QChart;
+  chart->legend()->hide();
+  m_series = new QLineSeries;
+  chart->addSeries(m_series);
+  m_axisX = new QValueAxis;
+  m_axisX->setTitleText("minutes into the session");
+  m_axisX->setLabelFormat("%.0f");
+  m_axisY = new QValueAxis;
+  chart->addAxis(m_axisX, Qt::AlignBottom);
+  chart->addAxis(m_axisY, Qt::AlignLeft);
+  m_series->attachAxis(m_axisX);
+  m_series->attachAxis(m_axisY);
+  m_view = new QChartView(chart, this);
+  m_view->setRenderHint(QPainter::Antialiasing);
+  m_empty = new QLabel("No instrument. Open the chart from a price view row.", this);
+  m_empty->setAlignment(Qt::AlignCenter);
+  layout->addWidget(m_empty);
+  layout->addWidget(m_view, 1);
+}
+
+int CChartView::pointCount() const { return m_series ? static_cast<int>(m_series->count()) : 0; }
+
+void CChartView::InstrumentChanged() {
+  m_tradesShown = static_cast<std::size_t>(-1);
+  m_empty->setVisible(m_instrument < 0);
+  m_view->setVisible(m_instrument >= 0);
+  m_view->chart()->setTitle(InstrumentLabel());
+}
+
+void CChartView::Refresh() {
+  sim::Market* m = MarketOrNull();
+  if (!m || m_instrument < 0) {
+    m_series->clear();
+    return;
+  }
+  const auto& trades = m->Trades(m_instrument);
+  if (trades.size() == m_tradesShown) return;
+  m_tradesShown = trades.size();
+  const double start = m->Config().sessionStartSeconds * 1000.0;
+  QList<QPointF> points;
+  double lo = 0, hi = 0;
+  // At most ~800 points: every k-th trade, always the newest.
+  const std::size_t step = std::max<std::size_t>(1, trades.size() / 800);
+  for (std::size_t i = 0; i < trades.size(); i += step) {
+    const auto& t = trades[i];
+    points.append(QPointF((t.timeMs - start) / 60000.0, t.price));
+  }
+  if (!trades.empty() && (trades.size() - 1) % step != 0)
+    points.append(QPointF((trades.back().timeMs - start) / 60000.0, trades.back().price));
+  if (points.isEmpty()) {
+    const auto& q = m->QuoteOf(m_instrument);
+    if (q.close > 0) points.append(QPointF(0, q.close));
+  }
+  for (const auto& p : points) {
+    lo = lo == 0 ? p.y() : std::min(lo, p.y());
+    hi = std::max(hi, p.y());
+  }
+  m_series->replace(points);
+  const double pad = std::max((hi - lo) * 0.05, hi * 0.001);
+  m_axisY->setRange(lo - pad, hi + pad);
+  m_axisX->setRange(0, std::max(1.0, points.isEmpty() ? 1.0 : points.back().x()));
+}
+
+// ---- Instrument explorer ----------------------------------------------------
+
+void CExplorerView::Build() {
+  auto* layout = new QVBoxLayout(this);
+  m_search = new QLineEdit(this);
+  m_search->setPlaceholderText("Search code or name");
+  m_search->setClearButtonEnabled(true);
+  m_count = new QLabel(this);
+  auto* top = new QHBoxLayout;
+  top->addWidget(m_search, 1);
+  top->addWidget(m_count);
+  layout->addLayout(top);
+  m_model = new QStandardItemModel(0, 5, this);
+  m_model->setHorizontalHeaderLabels({"Product", "Code", "Exchange", "Name", "Type"});
+  m_table = new QTableView(this);
+  m_table->setModel(m_model);
+  m_table->verticalHeader()->hide();
+  m_table->setEditTriggers(QAbstractItemView::NoEditTriggers);
+  m_table->setSelectionBehavior(QAbstractItemView::SelectRows);
+  m_table->horizontalHeader()->setStretchLastSection(true);
+  m_table->viewport()->installEventFilter(this);
+  layout->addWidget(m_table, 1);
+  auto* hint = new QLabel("Drag instruments onto a watchlist of the price view; double-click to link them.", this);
+  hint->setWordWrap(true);
+  layout->addWidget(hint);
+  connect(m_search, &QLineEdit::textChanged, this, [this](const QString& t) { search(t); });
+  connect(m_table, &QTableView::doubleClicked, this, [this](const QModelIndex& index) {
+    if (!Runtime()) return;
+    bool ok = false;
+    const qint64 pid = m_model->item(index.row(), 0)->text().toLongLong(&ok);
+    if (ok) Runtime()->LinkInstrument(pid, m_model->item(index.row(), 1)->text().toStdString());
+  });
+  search({});
+}
+
+void CExplorerView::search(const QString& text) {
+  if (m_search->text() != text) {
+    m_search->setText(text);  // comes back here through textChanged
+    return;
+  }
+  m_model->removeRows(0, m_model->rowCount());
+  sim::Market* m = MarketOrNull();
+  if (!m) return;
+  constexpr int kLimit = 500;
+  const QString needle = text.trimmed();
+  int matches = 0;
+  for (const auto& ins : m->Instruments()) {
+    const QString code = QString::fromStdString(ins.instrumentCode);
+    const QString display = QString::fromStdString(ins.displayCode);
+    const QString name = QString::fromStdString(ins.instrumentName);
+    if (!needle.isEmpty() && !code.contains(needle, Qt::CaseInsensitive) &&
+        !display.contains(needle, Qt::CaseInsensitive) && !name.contains(needle, Qt::CaseInsensitive))
+      continue;
+    if (++matches > kLimit) continue;
+    QList<QStandardItem*> row;
+    row << new QStandardItem(QString::number(ins.productId)) << new QStandardItem(code)
+        << new QStandardItem(QString::fromStdString(ins.exchangeCode)) << new QStandardItem(name)
+        << new QStandardItem(QString::fromStdString(ins.productType));
+    m_model->appendRow(row);
+  }
+  m_count->setText(matches > kLimit ? QString("%1 of %2").arg(kLimit).arg(matches) : QString::number(matches));
+}
+
+int CExplorerView::resultCount() const { return m_model ? m_model->rowCount() : 0; }
+
+bool CExplorerView::eventFilter(QObject* watched, QEvent* event) {
+  if (watched == m_table->viewport()) {
+    if (event->type() == QEvent::MouseButtonPress) {
+      m_pressPos = static_cast<QMouseEvent*>(event)->position().toPoint();
+    } else if (event->type() == QEvent::MouseMove) {
+      auto* me = static_cast<QMouseEvent*>(event);
+      if ((me->buttons() & Qt::LeftButton) &&
+          (me->position().toPoint() - m_pressPos).manhattanLength() >= QApplication::startDragDistance()) {
+        StartDrag();
+        return true;
+      }
+    }
+  }
+  return CTerminalView::eventFilter(watched, event);
+}
+
+void CExplorerView::StartDrag() {
+  const auto rows = m_table->selectionModel()->selectedRows();
+  if (rows.isEmpty()) return;
+  // A link text with one object per instrument.
+  QStringList objects;
+  for (const auto& r : rows) {
+    objects << QString("{\"Field_product_id\":\"%1\",\"Field_instrument_code\":\"%2\",\"Field_exchange_code\":\"%3\"}")
+                   .arg(JsonEscape(m_model->item(r.row(), 0)->text().toStdString()),
+                        JsonEscape(m_model->item(r.row(), 1)->text().toStdString()),
+                        JsonEscape(m_model->item(r.row(), 2)->text().toStdString()));
+  }
+  const QString link = QString("{\"type\":\"%1\",\"data\":[%2]}")
+                           .arg(rows.size() > 1 ? "instrument view multiple" : "instrument view", objects.join(','));
+  auto* mime = new QMimeData;
+  mime->setData("application/x-marketviews-link", link.toUtf8());
+  mime->setData("application/x-marketviews-source", QByteArray("CInsExpViewEx"));
+  mime->setText(link);
+  auto* drag = new QDrag(this);
+  drag->setMimeData(mime);
+  drag->exec(Qt::CopyAction);
+}
+
+// ---- Analytics --------------------------------------------------------------
+
+void CAnalyticsView::Build() {
+  auto* layout = new QVBoxLayout(this);
+  m_empty = new QLabel("No instrument. Open analytics from a price view row.", this);
+  m_table = MakeTable({"Measure", "Value"}, this);
+  layout->addWidget(m_empty);
+  layout->addWidget(m_table, 1);
+}
+
+void CAnalyticsView::Refresh() {
+  const auto* ins = InstrumentAt(m_instrument);
+  m_empty->setVisible(!ins);
+  m_table->setVisible(ins != nullptr);
+  if (!ins) {
+    m_table->setRowCount(0);
+    return;
+  }
+  sim::Market* m = MarketOrNull();
+  const auto& q = m->QuoteOf(m_instrument);
+  const auto summary = m->Summary(m_instrument);
+  std::int64_t bidVol = 0, askVol = 0;
+  for (const auto& line : summary) { bidVol += line.bidVolume; askVol += line.askVolume; }
+  const double change = q.last > 0 && q.close > 0 ? q.last - q.close : 0;
+  auto pct = [](double v) { return QString::number(v, 'f', 2) + "%"; };
+  std::vector<std::pair<QString, QString>> rows = {
+      {"Instrument", QString::fromStdString(ins->displayCode.empty() ? ins->instrumentCode : ins->displayCode)},
+      {"Name", QString::fromStdString(ins->instrumentName)},
+      {"Exchange", QString::fromStdString(ins->exchangeCode)},
+      {"Product type", QString::fromStdString(ins->productType)},
+      {"Sector", QString::fromStdString(ins->sector)},
+      {"Currency", QString::fromStdString(ins->currency)},
+      {"Lot size", Grouped(ins->lotSize)},
+      {"Last", Price(m_instrument, q.last)},
+      {"Change", q.close > 0 && q.last > 0 ? QString::fromStdString(m->FormatPrice(m_instrument, change)) : "-"},
+      {"% Change", q.close > 0 && q.last > 0 ? pct(change / q.close * 100) : "-"},
+      {"Open", Price(m_instrument, q.open)},
+      {"High", Price(m_instrument, q.high)},
+      {"Low", Price(m_instrument, q.low)},
+      {"Previous close", Price(m_instrument, q.close)},
+      {"Bid", Price(m_instrument, q.bid)},
+      {"Ask", Price(m_instrument, q.ask)},
+      {"Spread", q.bid > 0 && q.ask > 0 ? QString::fromStdString(m->FormatPrice(m_instrument, q.ask - q.bid)) : "-"},
+      {"Volume", Grouped(q.volume)},
+      {"Turnover", Grouped(static_cast<std::int64_t>(std::llround(q.turnover)))},
+      {"Trades", Grouped(q.trades)},
+      {"VWAP", q.volume > 0 ? Price(m_instrument, q.turnover / static_cast<double>(q.volume)) : "-"},
+      {"Average trade size", q.trades > 0 ? Grouped(q.volume / q.trades) : "-"},
+      {"Day range", q.low > 0 ? pct((q.high - q.low) / q.low * 100) : "-"},
+      {"Bought at the ask", bidVol + askVol > 0 ? pct(100.0 * static_cast<double>(askVol) /
+                                                        static_cast<double>(bidVol + askVol))
+                                                 : "-"},
+      {"Price levels traded", QString::number(summary.size())},
+  };
+  m_table->setRowCount(static_cast<int>(rows.size()));
+  for (std::size_t i = 0; i < rows.size(); ++i) SetRow(m_table, static_cast<int>(i), {rows[i].first, rows[i].second});
+}
+
+// ---- News -------------------------------------------------------------------
+
+void CNewsView::Build() {
+  auto* layout = new QVBoxLayout(this);
+  m_table = MakeTable({"Time", "Headline"}, this);
+  layout->addWidget(m_table, 1);
+}
+
+void CNewsView::Add(const QString& time, const QString& headline) {
+  m_table->insertRow(0);  // newest first
+  SetRow(m_table, 0, {time, headline});
+  if (m_table->rowCount() > 500) m_table->setRowCount(500);
+}
+
+void CNewsView::InstrumentChanged() {
+  m_table->setRowCount(0);
+  m_lastReportedChange = 0;
+  m_lastReportedVolume = 0;
+  m_lastTrades = 0;
+  m_lastHigh = m_lastLow = 0;
+  m_lastRemarks.clear();
+  const auto* ins = InstrumentAt(m_instrument);
+  if (!ins) {
+    Add("", "No instrument. Open news from a price view row.");
+    return;
+  }
+  sim::Market* m = MarketOrNull();
+  const auto& q = m->QuoteOf(m_instrument);
+  const QString name = QString::fromStdString(ins->instrumentName);
+  Add(QString::fromStdString(m->TimeText()),
+      QString("%1 (%2, %3): previous close %4, opened at %5")
+          .arg(name, QString::fromStdString(ins->exchangeCode), QString::fromStdString(ins->sector),
+               Price(m_instrument, q.close), Price(m_instrument, q.open)));
+  m_lastHigh = q.high;
+  m_lastLow = q.low;
+  m_lastReportedVolume = q.volume;
+  m_lastRemarks = q.remarks;
+}
+
+void CNewsView::Refresh() {
+  const auto* ins = InstrumentAt(m_instrument);
+  if (!ins) return;
+  sim::Market* m = MarketOrNull();
+  const auto& q = m->QuoteOf(m_instrument);
+  const QString time = QString::fromStdString(m->TimeText());
+  const QString name = QString::fromStdString(ins->instrumentName);
+  if (q.last > 0 && q.close > 0) {
+    const double pchange = (q.last - q.close) / q.close * 100;
+    // A headline for every further full percent of move.
+    if (std::floor(std::abs(pchange)) > std::floor(std::abs(m_lastReportedChange)) ||
+        (pchange > 0) != (m_lastReportedChange > 0)) {
+      if (std::abs(pchange) >= 1)
+        Add(time, QString("%1 %2 %3% to %4").arg(name, pchange > 0 ? "rises" : "falls")
+                      .arg(std::abs(pchange), 0, 'f', 2).arg(Price(m_instrument, q.last)));
+      m_lastReportedChange = pchange;
+    }
+  }
+  if (m_lastHigh > 0 && q.high > m_lastHigh * 1.002) {
+    Add(time, QString("%1 reaches a session high of %2").arg(name, Price(m_instrument, q.high)));
+    m_lastHigh = q.high;
+  }
+  if (m_lastLow > 0 && q.low > 0 && q.low < m_lastLow * 0.998) {
+    Add(time, QString("%1 drops to a session low of %2").arg(name, Price(m_instrument, q.low)));
+    m_lastLow = q.low;
+  }
+  // Heavy trading: every time the volume doubles.
+  if (q.volume > 0 && q.volume >= std::max<std::int64_t>(2 * m_lastReportedVolume, 10000)) {
+    Add(time, QString("Active trading in %1: %2 traded so far").arg(name, Grouped(q.volume)));
+    m_lastReportedVolume = q.volume;
+  }
+  if (q.remarks != m_lastRemarks) {
+    if (!q.remarks.empty())
+      Add(time, QString("Exchange remark on %1: %2").arg(name, QString::fromStdString(q.remarks)));
+    m_lastRemarks = q.remarks;
+  }
+}
+
+}  // namespace term::views
