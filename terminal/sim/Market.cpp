@@ -92,25 +92,30 @@ std::string LetterCode(std::uint64_t n) {
   return s;
 }
 
+// Letter, digit, letter-or-digit: never all letters, so never another
+// exchange's code.
 std::string SgxCode(std::uint64_t n) {
   static const char* alnum = "0123456789ABCDEFGHIJKLMNOPQRSTUVWXYZ";
-  std::uint64_t space = 26 * 36 * 36;
+  std::uint64_t space = 26 * 10 * 36;
   int len = 3;
   while (n >= space) { n -= space; space *= 36; ++len; }
   std::uint64_t v = Scramble(n, space);
   std::string s(len, '0');
-  for (int i = len - 1; i >= 1; --i) { s[i] = alnum[v % 36]; v /= 36; }
+  for (int i = len - 1; i >= 2; --i) { s[i] = alnum[v % 36]; v /= 36; }
+  s[1] = char('0' + v % 10);
+  v /= 10;
   s[0] = char('A' + v % 26);
   return s;
 }
 
-std::string DigitCode(std::uint64_t n, std::uint64_t first, std::uint64_t last) {
-  std::uint64_t space = last - first + 1;
-  int width = 4;
-  if (n >= space) { n -= space; first = 10000; space = 90000; width = 5; }
-  if (n >= space) { n -= space; first = 100000; space = 900000; width = 6; }
-  char buf[16];
-  std::snprintf(buf, sizeof buf, "%0*llu", width, static_cast<unsigned long long>(first + Scramble(n, space)));
+std::string DigitCode(std::uint64_t n, std::uint64_t first, std::uint64_t last, int width) {
+  const std::uint64_t space = last - first + 1;
+  char buf[24];
+  if (n < space) {
+    std::snprintf(buf, sizeof buf, "%0*llu", width, static_cast<unsigned long long>(first + Scramble(n, space)));
+  } else {
+    std::snprintf(buf, sizeof buf, "%0*llu", width + 2, static_cast<unsigned long long>(n - space));
+  }
   return buf;
 }
 
@@ -436,7 +441,8 @@ void Market::Impl::Build() {
   const int equities = std::max(16, int(remaining / 1.35));
   const int twins = remaining - equities;
   std::vector<std::uint64_t> counters(std::size(kExchanges), 0);
-  std::unordered_set<std::string> names;
+  std::unordered_set<std::string> names, codes;
+  std::uint64_t letterCounter = 0;
   for (int k = 0; k < equities; ++k) {
     double pick = r.Uniform();
     int ex = 0;
@@ -449,9 +455,11 @@ void Market::Impl::Build() {
     const std::uint64_t n = counters[ex]++;
     std::string code;
     if (ex == 0) code = SgxCode(n);
-    else if (ex == 1) code = DigitCode(n, 1, 9999);
-    else if (ex == 2) code = DigitCode(n, 1300, 9999);
-    else code = LetterCode(n);
+    else if (ex == 1) code = DigitCode(n, 1, 99999, 5);
+    else if (ex == 2) code = DigitCode(n, 1300, 9999, 4);
+    else code = LetterCode(letterCounter++);  // one sequence for the letter-coded exchanges
+    // Codes are unique per product: the key of an instrument.
+    while (!codes.insert(code).second) code += 'X';
     const SectorDef& sec = kSectors[r.Range(0, int(std::size(kSectors)) - 1)];
     std::string stem = std::string(kSyllA[r.Range(0, int(std::size(kSyllA)) - 1)]) +
                        kSyllB[r.Range(0, int(std::size(kSyllB)) - 1)];
@@ -481,7 +489,7 @@ void Market::Impl::Build() {
     rec.maxQty1 = inf.lot * 5000;
     rec.maxQty2 = inf.lot * 1000;
     rec.isin = std::string(ex == 0 ? "SG" : ex == 1 ? "HK" : ex == 2 ? "JP" : ex == 3 ? "AU" : ex == 6 ? "GB" : "US") +
-               DigitCode(n * 31 + 7, 1, 9999) + code;
+               DigitCode(n * 31 + 7, 1, 9999, 4) + code;
     const double a = r.Uniform();
     if (a < 0.01) rec.accessStatus = 0;       // neither
     else if (a < 0.03) rec.accessStatus = 2;  // tradeable, not viewable

@@ -1,0 +1,291 @@
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <set>
+
+#include "TapeParsing.h"
+#include "terminal/sim/Market.h"
+
+using sim::Market;
+using sim::MarketConfig;
+
+namespace {
+
+MarketConfig Config(std::uint64_t seed = 7, int instruments = 1500) {
+  MarketConfig c;
+  c.seed = seed;
+  c.instruments = instruments;
+  return c;
+}
+
+// The busiest equity: most trades at the start.
+int BusyEquity(Market& m) {
+  int best = -1, trades = -1;
+  for (int i = 0; i < int(m.Instruments().size()); ++i) {
+    if (m.Instruments()[i].productType != "ES" || m.Instruments()[i].exchangeCode == "WIDX") continue;
+    const int t = m.QuoteOf(i).trades;
+    if (t > trades) { trades = t; best = i; }
+  }
+  return best;
+}
+
+std::string Snapshot(Market& m, const std::vector<int>& sample) {
+  std::string s;
+  for (int i : sample) {
+    for (const char* f : {"BID", "ASK", "LAST", "HIGH", "LOW", "VOL", "BVOL", "SVOL", "CHANGE", "PCHANGE"})
+      s += m.FieldValue(i, f, 0, 0) + ",";
+    s += m.TradePageText(i, Market::kLivePage) + "\n";
+    s += m.FieldValue(i, "BUY", 5, 1) + m.FieldValue(i, "SVOL", 7, 1) + "\n";
+  }
+  return s;
+}
+
+}  // namespace
+
+TEST(Market, SameSeedAndClockGiveTheSameMarket) {
+  Market a(Config()), b(Config()), c(Config(8));
+  std::vector<int> sample;
+  for (int i = 0; i < int(a.Instruments().size()); i += 97) sample.push_back(i);
+  for (int i : sample) { a.AddInterest(i); b.AddInterest(i); c.AddInterest(i); }
+  // The same ticks reached in different strides play the same steps.
+  a.AdvanceTo(30000);
+  for (std::uint32_t t = 1000; t <= 30000; t += 1000) b.AdvanceTo(t);
+  c.AdvanceTo(30000);
+  ASSERT_EQ(a.Instruments().size(), b.Instruments().size());
+  for (std::size_t k = 0; k < a.Instruments().size(); k += 50) {
+    EXPECT_EQ(a.Instruments()[k].instrumentCode, b.Instruments()[k].instrumentCode);
+    EXPECT_EQ(a.Instruments()[k].instrumentName, b.Instruments()[k].instrumentName);
+  }
+  EXPECT_EQ(Snapshot(a, sample), Snapshot(b, sample));
+  EXPECT_EQ(a.TakeChanged(), b.TakeChanged());
+  EXPECT_NE(Snapshot(a, sample), Snapshot(c, sample));
+}
+
+TEST(Market, ReferenceDataCoversProductsExchangesAndAccess) {
+  Market m(Config(11, 4000));
+  EXPECT_EQ(m.Instruments().size(), 4000u);
+  std::set<std::string> types, exchanges;
+  for (const auto& p : m.Products()) types.insert(p.productType);
+  EXPECT_EQ(types, (std::set<std::string>{"ES", "CS", "CFD", "FUT", "FX", "DMA"}));
+  for (const auto& e : m.Exchanges()) exchanges.insert(e.exchangeCode);
+  for (const char* e : {"SGX", "SEHK", "TSE", "WIDX"}) EXPECT_TRUE(exchanges.count(e)) << e;
+
+  std::set<std::pair<std::int64_t, std::string>> keys;
+  int keldo = 0, hidden = 0, viewOnly = 0, futures = 0;
+  for (int i = 0; i < int(m.Instruments().size()); ++i) {
+    const auto& r = m.Instruments()[i];
+    EXPECT_TRUE(keys.insert({r.productId, r.instrumentCode}).second) << "duplicate " << r.instrumentCode;
+    EXPECT_TRUE(types.count(r.productType));
+    EXPECT_TRUE(exchanges.count(r.exchangeCode)) << r.exchangeCode;
+    EXPECT_FALSE(r.instrumentName.empty());
+    EXPECT_GE(r.decimals, 0);
+    EXPECT_LE(r.decimals, 4);
+    EXPECT_GT(r.lotSize, 0);
+    EXPECT_EQ(m.Find(r.productId, r.instrumentCode), i);
+    if (r.instrumentCode.rfind("[KELDO]", 0) == 0) {
+      ++keldo;
+      EXPECT_EQ(r.displayCode, r.instrumentCode.substr(7));
+    }
+    hidden += r.accessStatus == 0 || r.accessStatus == 2;
+    viewOnly += r.accessStatus == 1;
+    if (r.productType == "FUT") {
+      ++futures;
+      EXPECT_FALSE(m.QuoteOf(i).month.empty());
+      EXPECT_EQ(m.QuoteOf(i).year.size(), 4u);
+    }
+  }
+  EXPECT_GT(keldo, 0);
+  EXPECT_GT(hidden, 0);
+  EXPECT_GT(viewOnly, 0);
+  EXPECT_GT(futures, 0);
+  EXPECT_GE(m.WorldIndices().size(), 10u);
+  for (int i : m.WorldIndices()) EXPECT_EQ(m.Instruments()[i].exchangeCode, "WIDX");
+  EXPECT_FALSE(m.Sectors().empty());
+  for (const auto& b : m.BrandWatchlists()) {
+    EXPECT_FALSE(b.instruments.empty());
+    for (int i : b.instruments) EXPECT_EQ(m.Instruments()[i].instrumentCode.rfind("[KELDO]", 0), 0u);
+  }
+}
+
+TEST(Market, QuotesStayCoherentWithTheTape) {
+  Market m(Config());
+  const int i = BusyEquity(m);
+  m.AddInterest(i);
+  m.AdvanceTo(120000);
+  const sim::Quote q = m.QuoteOf(i);
+  ASSERT_GT(q.trades, 0);
+  EXPECT_LT(q.bid, q.ask);
+  EXPECT_LE(q.low, q.last);
+  EXPECT_LE(q.last, q.high);
+  EXPECT_LE(q.low, q.open);
+  EXPECT_LE(q.open, q.high);
+  const auto& tape = m.Trades(i);
+  ASSERT_EQ(int(tape.size()), q.trades);
+  std::int64_t vol = 0;
+  double hi = 0, lo = 1e18;
+  for (const auto& t : tape) { vol += t.volume; hi = std::max(hi, t.price); lo = std::min(lo, t.price); }
+  EXPECT_EQ(vol, q.volume);
+  EXPECT_DOUBLE_EQ(hi, q.high);
+  EXPECT_DOUBLE_EQ(lo, q.low);
+  EXPECT_DOUBLE_EQ(tape.back().price, q.last);
+  EXPECT_EQ(tape.front().side, 3) << "the day opens with the auction";
+  EXPECT_EQ(m.FieldValue(i, "CHANGE", 0, 0), m.FormatPrice(i, q.last - q.close));
+  EXPECT_EQ(m.FieldValue(i, "VOL", 0, 0), std::to_string(q.volume));
+  // A twin (CFD, DMA, brand) shows its underlying's market.
+  for (int k = 0; k < int(m.Instruments().size()); ++k) {
+    const auto& r = m.Instruments()[k];
+    if (k != i && r.exchangeCode == m.Instruments()[i].exchangeCode && r.instrumentCode.find(m.Instruments()[i].instrumentCode) != std::string::npos)
+      EXPECT_EQ(m.FieldValue(k, "LAST", 0, 0), m.FieldValue(i, "LAST", 0, 0)) << r.instrumentCode;
+  }
+}
+
+TEST(Market, BookHas99OrderedLevelsAroundTheBestPrices) {
+  Market m(Config());
+  const int i = BusyEquity(m);
+  const sim::Quote q = m.QuoteOf(i);
+  const auto book = m.Book(i, 99);
+  ASSERT_EQ(book.size(), 99u);
+  EXPECT_DOUBLE_EQ(book[0].bid, q.bid);
+  EXPECT_DOUBLE_EQ(book[0].ask, q.ask);
+  EXPECT_EQ(book[0].bidVolume, q.bidVolume);
+  for (std::size_t k = 1; k < book.size(); ++k) {
+    EXPECT_GT(book[k].ask, book[k - 1].ask);
+    if (book[k].bid > 0) EXPECT_LT(book[k].bid, book[k - 1].bid);
+    if (book[k].bidVolume > 0) {
+      EXPECT_GE(book[k].bidOrders, 1);
+      EXPECT_LE(book[k].bidOrders, book[k].bidVolume);
+    }
+  }
+  EXPECT_EQ(m.Depth(i, 42).ask, book[41].ask);
+  EXPECT_EQ(m.FieldValue(i, "SELL", 42, 1), m.FormatPrice(i, book[41].ask));
+  EXPECT_EQ(m.FieldValue(i, "BUY", 0, 1), "") << "level 0 does not exist";
+  EXPECT_EQ(m.FieldValue(i, "BUY", 100, 1), "") << "nor does level 100";
+}
+
+TEST(Market, TradePagesReadBackIntoTheSameTrades) {
+  Market m(Config());
+  const int i = BusyEquity(m);
+  m.AddInterest(i);
+  m.AdvanceTo(60000);
+  const auto& tape = m.Trades(i);
+  const int n = int(tape.size());
+  ASSERT_GT(n, 150) << "needs more than one page";
+  const int pages = std::atoi(m.FieldValue(i, "PAGECOUNT", Market::kHeaderParam, 2).c_str());
+  EXPECT_EQ(pages, (n + 99) / 100);
+  std::map<int, tape::ParsedTrade> all;
+  for (int p = 1; p <= pages; ++p) {
+    const auto page = tape::ParseTradePage(m.FieldValue(i, "TRADEDATA", p, 2));
+    ASSERT_FALSE(page.empty());
+    EXPECT_EQ(page.begin()->first, (p - 1) * 100 + 1);
+    EXPECT_EQ(page.rbegin()->first, std::min(n, p * 100));
+    all.insert(page.begin(), page.end());
+  }
+  ASSERT_EQ(int(all.size()), n);
+  for (int num = 1; num <= n; ++num) {
+    const auto& t = tape[std::size_t(num - 1)];
+    const auto& p = all.at(num);
+    EXPECT_EQ(p.price, m.FormatPrice(i, t.price));
+    EXPECT_EQ(p.volume, std::to_string(t.volume));
+    EXPECT_EQ(p.side, std::to_string(int(t.side)));
+    ASSERT_EQ(p.time.size(), 16u) << "date then time";
+    EXPECT_EQ(p.time.substr(0, 8), "20261207");
+  }
+  // The live page starts with the newest trade: its number is the row count.
+  int first = 0;
+  const auto live = tape::ParseTradePage(m.TradePageText(i, Market::kLivePage), &first);
+  EXPECT_EQ(first, n);
+  EXPECT_EQ(int(live.size()), 100);
+  EXPECT_EQ(m.TradePageText(i, pages + 1), "");
+}
+
+TEST(Market, SummaryPagesHoldFortyLinesAndTotals) {
+  Market m(Config());
+  const int i = BusyEquity(m);
+  m.AddInterest(i);
+  m.AdvanceTo(60000);
+  const auto lines = m.Summary(i);
+  const int count = std::atoi(m.FieldValue(i, "COUNT", 1, 3).c_str());
+  const int pages = std::atoi(m.FieldValue(i, "PAGECOUNT", 1, 3).c_str());
+  ASSERT_EQ(count, int(lines.size()));
+  EXPECT_EQ(pages, (count + 39) / 40);
+  std::map<int, tape::ParsedLine> all;
+  for (int p = 1; p <= pages; ++p) {
+    const auto page = tape::ParseSummaryPage(m.FieldValue(i, "TRADEDATA", p, 3), p);
+    EXPECT_TRUE(page.count(99999)) << "every page carries the totals";
+    for (const auto& [line, v] : page) all[line] = v;
+  }
+  std::int64_t vol = 0, trades = 0;
+  for (int line = 1; line <= count; ++line) {
+    ASSERT_TRUE(all.count(line)) << line;
+    const auto& l = lines[std::size_t(line - 1)];
+    EXPECT_EQ(all[line].price, m.FormatPrice(i, l.price));
+    EXPECT_EQ(all[line].volume, std::to_string(l.volume));
+    EXPECT_EQ(std::stoll(all[line].bid) + std::stoll(all[line].ask) <= l.volume, true);
+    if (line > 1) EXPECT_LT(l.price, lines[std::size_t(line - 2)].price) << "highest price first";
+    vol += l.volume;
+    trades += l.trades;
+  }
+  EXPECT_EQ(all[99999].volume, std::to_string(m.QuoteOf(i).volume));
+  EXPECT_EQ(all[99999].trades, std::to_string(m.QuoteOf(i).trades));
+  EXPECT_EQ(vol, m.QuoteOf(i).volume);
+  EXPECT_EQ(trades, m.QuoteOf(i).trades);
+}
+
+TEST(Market, WatchedInstrumentsMoveAndReportChanges) {
+  Market m(Config());
+  const int i = BusyEquity(m);
+  m.TakeChanged();
+  const std::string before = m.TradePageText(i, Market::kLivePage) + m.FieldValue(i, "BID", 0, 0) + m.FieldValue(i, "BVOL", 0, 0);
+  m.AddInterest(i);
+  m.AdvanceTo(10000);
+  const auto changed = m.TakeChanged();
+  EXPECT_TRUE(std::binary_search(changed.begin(), changed.end(), i));
+  EXPECT_TRUE(std::is_sorted(changed.begin(), changed.end()));
+  EXPECT_NE(before, m.TradePageText(i, Market::kLivePage) + m.FieldValue(i, "BID", 0, 0) + m.FieldValue(i, "BVOL", 0, 0));
+  EXPECT_TRUE(m.TakeChanged().empty()) << "taken once";
+  m.RemoveInterest(i);
+  EXPECT_EQ(m.InterestCount(), 0);
+}
+
+TEST(Market, Top30ListsRankTheSimulation) {
+  Market m(Config(3, 3000));
+  const auto groups = m.Top30();
+  ASSERT_FALSE(groups.empty());
+  for (const auto& g : groups) {
+    ASSERT_EQ(g.lists.size(), 4u);
+    EXPECT_EQ(g.lists[0].listName, "TOPGAIN");
+    EXPECT_EQ(g.lists[1].listName, "TOPLOSE");
+    EXPECT_EQ(g.lists[2].listName, "TOPVOL");
+    for (const auto& l : g.lists) EXPECT_LE(l.instruments.size(), 30u);
+    double prev = 1e9;
+    for (const auto& it : g.lists[0].instruments) {
+      const int i = m.Find(it.productId, it.instrumentCode);
+      ASSERT_GE(i, 0);
+      const auto q = m.QuoteOf(i);
+      const double pct = (q.last - q.close) / q.close;
+      EXPECT_GT(pct, 0);
+      EXPECT_LE(pct, prev);
+      prev = pct;
+    }
+  }
+}
+
+TEST(Market, SessionClockFollowsTheTicksAcrossMidnight) {
+  MarketConfig c = Config();
+  c.sessionStartSeconds = 23 * 3600 + 59 * 60 + 30;
+  Market m(c);
+  EXPECT_EQ(m.DateText(), "2026-12-07");
+  EXPECT_EQ(m.TimeText(), "23:59:30");
+  m.AdvanceTo(45000);
+  EXPECT_EQ(m.DateText(), "2026-12-08");
+  EXPECT_EQ(m.TimeText(), "00:00:15");
+}
+
+TEST(Market, StepTablesFallBackToTheDefaultTable) {
+  Market m(Config());
+  EXPECT_DOUBLE_EQ(m.StepAt(0, 0.5), 0.005);
+  EXPECT_DOUBLE_EQ(m.StepAt(0, 1.0, true), 0.01);
+  EXPECT_DOUBLE_EQ(m.StepAt(0, 1.0, false), 0.005) << "downwards at a boundary the band below applies";
+  EXPECT_DOUBLE_EQ(m.StepAt(2, 3500), 5);
+  EXPECT_DOUBLE_EQ(m.StepAt(77, 0.5), 0.005) << "unknown table";
+}
