@@ -1,6 +1,7 @@
 #include "mvtest/ScriptedHost.h"
 
 #include <dlfcn.h>
+#include <unistd.h>
 
 #include <QApplication>
 #include <algorithm>
@@ -16,6 +17,8 @@ static_assert(std::is_standard_layout_v<ViewLink>, "ViewLink must start with its
 
 void EnsureApplication() {
   if (QApplication::instance()) return;
+  // Tests never open real windows, whoever runs them.
+  if (!std::getenv("QT_QPA_PLATFORM")) setenv("QT_QPA_PLATFORM", "offscreen", 1);
   static int argc = 1;
   static char name[] = "mv-tests";
   static char* argv[] = {name, nullptr};
@@ -30,6 +33,13 @@ platform::RecordingDialogService& InstallDialogs() {
   return *raw;
 }
 
+FakeLogFactory& SharedLogFactory() {
+  static FakeLogFactory* factory = new FakeLogFactory;  // never freed: loggers stay valid
+  factory->lines.clear();
+  factory->created = 0;
+  return *factory;
+}
+
 }  // namespace
 
 // ---- AddonLibrary ------------------------------------------------------------
@@ -39,13 +49,24 @@ AddonLibrary& AddonLibrary::Get() {
   return library;
 }
 
+// MV_ADDON, else lib/libmarketviews.so next to the test's folder (<build>/tests/..).
+static std::string AddonPath() {
+  if (const char* path = std::getenv("MV_ADDON"); path && *path) return path;
+  char exe[4096];
+  const ssize_t n = readlink("/proc/self/exe", exe, sizeof exe - 1);
+  if (n <= 0) return {};
+  std::string dir(exe, static_cast<std::size_t>(n));
+  dir.erase(dir.find_last_of('/'));
+  return dir + "/../lib/libmarketviews.so";
+}
+
 AddonLibrary::AddonLibrary() {
-  const char* path = std::getenv("MV_ADDON");
-  if (!path || !*path) {
-    m_error = "MV_ADDON is not set";
+  m_path = AddonPath();
+  if (m_path.empty()) {
+    m_error = "MV_ADDON is not set and the test's own path is unknown";
     return;
   }
-  m_path = path;
+  const char* path = m_path.c_str();
   // As the terminal loads it: resolve everything now, keep the symbols private.
   void* handle = dlopen(path, RTLD_NOW | RTLD_LOCAL);
   if (!handle) {
@@ -64,7 +85,7 @@ const CRuntimeClass* AddonLibrary::Find(const char* className) const {
 // ---- ScriptedHost ------------------------------------------------------------
 
 ScriptedHost::ScriptedHost()
-    : clock((EnsureApplication(), platform::UseVirtualClock())), dialogs(InstallDialogs()) {}
+    : logs(SharedLogFactory()), clock((EnsureApplication(), platform::UseVirtualClock())), dialogs(InstallDialogs()) {}
 
 ScriptedHost::~ScriptedHost() {
   while (!m_views.empty()) Destroy(m_views.back());

@@ -11,7 +11,8 @@
 //   host.Advance(200);                                // virtual clock: fires due timers, delivers posts
 //
 // Views come from the add-on library named by the environment variable
-// MV_ADDON, loaded with dlopen and GetBaseViewPointer as the terminal does.
+// MV_ADDON (else <build>/lib next to the test folder), loaded with dlopen and
+// GetBaseViewPointer as the terminal does.
 // The library stays loaded for the life of the process. A test can also hand
 // in a view it built itself (Adopt) to reach the add-on's internals.
 #include <any>
@@ -129,7 +130,9 @@ class ScriptedHost : public IViewHost {
   // ---- Services and time ----
   FakeLanguage language;
   FakeStyleManager style;
-  FakeLogFactory logs;
+  // Process-wide (the add-on's logger registry keeps pointers into it for the
+  // life of the process, as into the terminal's); emptied by each new host.
+  FakeLogFactory& logs;
   FakeMenuManager menus;
   std::wstring appTitle = L"Terminal";
   int styleId = 1;
