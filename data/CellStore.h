@@ -72,6 +72,7 @@ struct CellRecord {
   std::uint32_t updatedAt = 0;    // tick of the last change
   std::uint32_t readAt = 0;       // tick of the last Get
   std::int32_t decimals = 3;      // the record's number format is "%.<decimals>f"
+  bool instrumentKnown = false;   // decimals came from the instrument stores
   std::uint64_t version = 0;      // store version of the last change: a cheap "changed since"
   bool expiring = false;          // store bookkeeping: some cell carries a mark
 
@@ -181,6 +182,7 @@ class CellStore {
  private:
   Record MakeDefault(const Key& key, std::uint32_t now) const;
   void Touch(Record& r, std::uint32_t now);
+  void LearnDecimals(const Key& key, Record& r, std::uint32_t now);
   // Writers hold the lock, so a plain load and store suffice.
   std::uint64_t BumpVersion() {
     const std::uint64_t v = version_.load(std::memory_order_relaxed) + 1;
@@ -295,8 +297,11 @@ void CellStore<L>::Touch(Record& r, std::uint32_t now) {
 template <class L>
 typename CellStore<L>::Record CellStore<L>::MakeDefault(const Key& key, std::uint32_t now) const {
   Record r;
-  if constexpr (L::kInstrumentDecimals) r.decimals = mvd::RecordDecimals(lookup_(L::InstrumentOf(key)));
-  else r.decimals = 3;
+  if constexpr (L::kInstrumentDecimals) {
+    const int d = lookup_(L::InstrumentOf(key));
+    r.decimals = mvd::RecordDecimals(d);
+    r.instrumentKnown = d >= 0;
+  }
   for (std::size_t i = 0; i < kCellCount; ++i) {
     r.cells[i].text.assign(L::kCells[i].defaultText);
     r.cells[i].changedAt = now;
@@ -311,14 +316,35 @@ typename CellStore<L>::Record CellStore<L>::Get(const Key& key, std::uint32_t no
   std::lock_guard lock(mu_);
   const auto it = map_.find(key);
   if (it != map_.end()) {
-    it->second->readAt = now;
-    return *it->second;
+    Record& r = *it->second;
+    r.readAt = now;
+    if constexpr (L::kInstrumentDecimals) {
+      if (!r.instrumentKnown) LearnDecimals(key, r, now);
+    }
+    return r;
   }
   pending_.push_back(key);
   Record& r = records_.emplace_back(MakeDefault(key, now));
   map_.emplace(key, &r);
   r.version = BumpVersion();
   return r;
+}
+
+// A record made before its instrument was known (the instrument list came
+// later) takes the instrument's format once it is, and reprints its prices.
+template <class L>
+void CellStore<L>::LearnDecimals(const Key& key, Record& r, std::uint32_t now) {
+  const int d = lookup_(L::InstrumentOf(key));
+  if (d < 0) return;
+  r.instrumentKnown = true;
+  const int dec = mvd::RecordDecimals(d);
+  if (dec == r.decimals) return;
+  r.decimals = dec;
+  for (std::size_t i = 0; i < kCellCount; ++i) {
+    QuoteCell& c = r.cells[i];
+    if (L::kCells[i].kind == CellKind::Price && c.filled && !c.text.empty()) mvd::FormatFixed(c.value, dec, c.text);
+  }
+  Touch(r, now);
 }
 
 template <class L>

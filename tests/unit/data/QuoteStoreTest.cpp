@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 
 #include <set>
+#include <thread>
 #include <unordered_set>
 
 #include "data/QuoteStore.h"
@@ -225,4 +226,48 @@ TEST_F(QuoteStoreTest, ApplyFieldUpdate_WidensTerminalText) {
   u.value = "caf\xc3\xa9 \xff ok";
   EXPECT_TRUE(ApplyFieldUpdate(store_, u, 5));
   EXPECT_EQ(store_.Get(InstrumentKey{1, L"Q\uFFFD"}, 6)[Q::Remarks].text, L"caf\u00e9 \uFFFD ok");
+}
+
+TEST_F(QuoteStoreTest, Get_InstrumentListArrivingLaterSetsTheFormat) {
+  const InstrumentKey late{9, L"LATE"};
+  store_.Get(late, 0);
+  store_.Update(late, L"BID", L"1.5", 1);
+  EXPECT_EQ(store_.Get(late, 2)[Q::Bid].text, L"1.500");
+  JInstrumentUnderlying ins;
+  ins.productId = 9;
+  ins.instrumentCode = "LATE";
+  ins.decimals = 1;
+  list_.push_back(ins);
+  InstrumentMgr_ReadOnly().Fill(&list_);
+  const QuoteRecord r = store_.Get(late, 3);
+  EXPECT_EQ(r.NumberFormat(), L"%.1f");
+  EXPECT_EQ(r[Q::Bid].text, L"1.5");
+  EXPECT_EQ(r[Q::Ask].text, L"0.000");  // no value yet: the default text stays
+  EXPECT_TRUE(r.changed);
+}
+
+TEST(QuoteStore_Threads, WritersAndReadersSeeWholeRecords) {
+  QuoteStore store;
+  const InstrumentKey k{1, L"T"};
+  store.Get(k, 0);
+  constexpr int kRounds = 20000;
+  std::thread writer([&] {
+    for (int i = 1; i <= kRounds; ++i) {
+      const std::wstring v = std::to_wstring(i);
+      store.Update(k, L"BID", v, static_cast<std::uint32_t>(i));
+      store.Update(k, L"ASK", v, static_cast<std::uint32_t>(i));
+      if (i % 64 == 0) store.ExpireMarks(static_cast<std::uint32_t>(i));
+    }
+  });
+  int torn = 0;
+  for (int i = 0; i < kRounds; ++i) {
+    const QuoteRecord r = store.Get(k, 0);
+    // BID leads ASK by at most one update; a copy never shows a half-written text.
+    const double bid = r[Q::Bid].value, ask = r[Q::Ask].value;
+    if (bid < ask || bid > ask + 1) ++torn;
+    if (!r[Q::Bid].text.empty() && r[Q::Bid].text.back() != L'0') ++torn;
+  }
+  writer.join();
+  EXPECT_EQ(torn, 0);
+  EXPECT_EQ(store.Get(k, 0)[Q::Ask].text, std::to_wstring(kRounds) + L".000");
 }
