@@ -1,7 +1,10 @@
 // Ingest and read paths of the market-data and reference stores, each against
 // a plain baseline doing the same essential work in the simplest way.
 //
-//   build/bin/bench_stores            (ends with "RATIO <name> <store/baseline>")
+//   cmake --build build --target bench_stores && build/bin/bench_stores
+// (a RelWithDebInfo or Release build). Each benchmark runs three times; the
+// summary after the table uses the fastest CPU time of each and ends with one
+// line "RATIO <name> <store/baseline>" per comparison.
 // bench-links: mv_data
 #include <benchmark/benchmark.h>
 
