@@ -5,7 +5,8 @@
 #include <QLineEdit>
 #include <QMouseEvent>
 #include <QPainter>
-#include <QPainterPath>
+#include <QHelpEvent>
+#include <QToolTip>
 #include <algorithm>
 
 #include "hostview/StyleRoles.h"
@@ -476,6 +477,26 @@ void CCustomTabCtrl::keyPressEvent(QKeyEvent* event) {
     default:
       QWidget::keyPressEvent(event);
   }
+}
+
+bool CCustomTabCtrl::event(QEvent* event) {
+  // A shortened label shows in full as a tool tip.
+  if (event->type() == QEvent::ToolTip) {
+    auto* help = static_cast<QHelpEvent*>(event);
+    const int item = HitTest(help->pos());
+    if (item >= 0) {
+      const QString full = Q(m_items[item].text);
+      const QRect r = GetItemRect(item);
+      if (QFontMetrics(font()).horizontalAdvance(full) > r.width() - kPad) {
+        QToolTip::showText(help->globalPos(), full, this, r);
+        return true;
+      }
+    }
+    QToolTip::hideText();
+    event->ignore();
+    return true;
+  }
+  return QWidget::event(event);
 }
 
 void CCustomTabCtrl::resizeEvent(QResizeEvent* event) {

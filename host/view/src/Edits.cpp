@@ -2,6 +2,7 @@
 
 #include <QCalendarWidget>
 #include <QHBoxLayout>
+#include <QKeyEvent>
 #include <QPlainTextEdit>
 #include <QRegularExpressionValidator>
 #include <QToolButton>
@@ -108,6 +109,10 @@ CFloatEdit::CFloatEdit(QWidget* parent, int decimals) : QLineEdit(parent) {
   setAlignment(Qt::AlignRight | Qt::AlignVCenter);
   UpdateValidator();
   connect(this, &QLineEdit::textChanged, this, [this] { emit valueChanged(GetValue()); });
+  // On leaving the edit the number is shown in full form and within range.
+  connect(this, &QLineEdit::editingFinished, this, [this] {
+    if (HasValue()) SetValue(GetValue());
+  });
 }
 
 void CFloatEdit::SetStyleManager(IStyleManager* styleManager) { ApplyEditStyle(this, styleManager); }
@@ -176,6 +181,24 @@ CBranticSpinBt::CBranticSpinBt(QWidget* parent, int ctrlId) : QWidget(parent), m
   connect(m_up, &QToolButton::clicked, this, [this] { Step(+1); });
   connect(m_down, &QToolButton::clicked, this, [this] { Step(-1); });
   setFixedWidth(18);
+}
+
+void CBranticSpinBt::SetBuddy(QWidget* buddy) {
+  if (m_buddy) m_buddy->removeEventFilter(this);
+  m_buddy = buddy;
+  if (m_buddy) m_buddy->installEventFilter(this);
+}
+
+bool CBranticSpinBt::eventFilter(QObject* watched, QEvent* event) {
+  // The arrow keys in the buddy step like the arrows.
+  if (watched == m_buddy && event->type() == QEvent::KeyPress && isEnabled()) {
+    const int key = static_cast<QKeyEvent*>(event)->key();
+    if (key == Qt::Key_Up || key == Qt::Key_Down) {
+      Step(key == Qt::Key_Up ? +1 : -1);
+      return true;
+    }
+  }
+  return QWidget::eventFilter(watched, event);
 }
 
 void CBranticSpinBt::SetStyleManager(IStyleManager* styleManager) {

@@ -37,6 +37,13 @@ TEST_F(ControlsTest, FloatEditShowsRoundedValueAndRefusesExtraDecimals) {
   QTest::keyClicks(&edit, QStringLiteral("-12.3456"));
   EXPECT_EQ(edit.text(), QStringLiteral("12.345"));
 
+  // Leaving the edit shows the number in full.
+  edit.clear();
+  QTest::keyClicks(&edit, QStringLiteral("1.5"));
+  QTest::keyClick(&edit, Qt::Key_Return);
+  EXPECT_EQ(edit.text(), QStringLiteral("1.500"));
+
+  edit.SetValue(12.345);
   edit.SetRange(-10, 10);
   EXPECT_EQ(edit.text(), QStringLiteral("10.000"));  // moved into the new range
   edit.clear();
@@ -62,6 +69,12 @@ TEST_F(ControlsTest, SpinAnnouncesStepThenMovesBuddy) {
   price.SetValue(0.02);
   spin.Step(-1);
   EXPECT_EQ(price.text(), QStringLiteral("0.00"));  // never below the edit's minimum
+
+  // The arrow keys in the price edit step as the arrows do.
+  price.SetValue(1.00);
+  QTest::keyClick(&price, Qt::Key_Up);
+  QTest::keyClick(&price, Qt::Key_Up);
+  EXPECT_EQ(price.text(), QStringLiteral("1.10"));
 
   spin.SetRange(0, 2);
   spin.SetPos(2);

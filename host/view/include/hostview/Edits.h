@@ -5,6 +5,7 @@
 #include <QDate>
 #include <QDateEdit>
 #include <QLineEdit>
+#include <QPointer>
 #include <QWidget>
 #include <string>
 
@@ -48,7 +49,8 @@ class HV_API CBranticEdit : public QWidget {
 // A decimal number with a fixed number of decimals (0..10). Typing is limited
 // to digits, one "." and the allowed number of decimals; a "-" only when the
 // range allows negatives (the range is 0 to 1e15 until SetRange). Separators
-// are never typed; the value is plain. Values are rounded as Double2Str does.
+// are never typed; the value is plain. Values are rounded as Double2Str does;
+// on leaving the edit the text is shown with all decimals and within range.
 class HV_API CFloatEdit : public QLineEdit {
   Q_OBJECT
  public:
@@ -89,7 +91,8 @@ class HV_API CBranticSpinBt : public QWidget {
   void SetStyleManager(IStyleManager* styleManager);
   void SetCtrlId(int id) { m_ctrlId = id; }
   int GetCtrlId() const { return m_ctrlId; }
-  void SetBuddy(QWidget* buddy) { m_buddy = buddy; }
+  // The Up and Down keys in the buddy step as the arrows do.
+  void SetBuddy(QWidget* buddy);
   QWidget* GetBuddy() const { return m_buddy; }
   void SetBuddyStep(double step) { m_buddyStep = step; }
   void SetRange(int min, int max);
@@ -102,11 +105,14 @@ class HV_API CBranticSpinBt : public QWidget {
   void positionChanging(int delta);
   void scrolled(int position);
 
+ protected:
+  bool eventFilter(QObject* watched, QEvent* event) override;
+
  private:
   IStyleManager* m_styleManager = nullptr;
   QToolButton* m_up = nullptr;
   QToolButton* m_down = nullptr;
-  QWidget* m_buddy = nullptr;
+  QPointer<QWidget> m_buddy;
   int m_ctrlId = 0;
   int m_min = -1000000;
   int m_max = 1000000;
