@@ -42,6 +42,8 @@ class CGridCellType {
                       bool current);
   // A drop list opened by this type closed with item `index` chosen (-1: none).
   virtual void OnDropListSelected(int col, int row, int index, const QString& text) {}
+  // Where the in-place editor goes inside the cell (the whole cell by default).
+  virtual QRect EditRect(int col, int row, const QRect& cellRect) { return cellRect; }
 
   // ---- Helpers ----
   CGridCtrl* Grid() const { return m_grid; }

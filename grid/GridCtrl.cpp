@@ -855,7 +855,10 @@ void CGridCtrl::PositionEditor() {
   if (!m_editor) return;
   const QRect r = CellRect(m_editCol, m_editRow);
   if (r.isEmpty()) { m_editor->hide(); return; }
-  m_editor->setGeometry(r.adjusted(1, 1, -1, -1));
+  CGridCell cell;
+  GetCell(m_editCol, m_editRow, cell);
+  const QRect area = CellTypeOf(cell, m_editCol, m_editRow)->EditRect(m_editCol, m_editRow, r);
+  m_editor->setGeometry(area == r ? r.adjusted(1, 1, -1, -1) : area);
   m_editor->show();
 }
 
