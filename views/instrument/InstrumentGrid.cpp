@@ -1,0 +1,92 @@
+#include "views/instrument/InstrumentGrid.h"
+
+#include <QPaintEvent>
+#include <QPainter>
+
+#include "hostview/Services.h"
+
+namespace {
+
+// One cell of the dump: tabs and line breaks would split it.
+QString DumpCell(QString text) {
+  for (QChar& c : text)
+    if (c == QLatin1Char('\t') || c == QLatin1Char('\r') || c == QLatin1Char('\n')) c = QLatin1Char(' ');
+  return text;
+}
+
+}  // namespace
+
+CInstrumentGrid::CInstrumentGrid(QWidget* parent) : CGridCtrl(parent) {}
+
+CInstrumentGrid::~CInstrumentGrid() = default;
+
+void CInstrumentGrid::SetMessage(const std::wstring& text) {
+  if (text == m_message) return;
+  m_message = text;
+  viewport()->update();
+}
+
+void CInstrumentGrid::SetStyleManager(IStyleManager* style) {
+  m_style = style;
+  if (style) {
+    m_oddRow = style->Color(kOddRow);
+    m_evenRow = style->Color(kEvenRow);
+    m_cellText = style->Color(kCellText);
+    m_changedText = style->Color(kChangedText);
+    m_changedBack = style->Color(kChangedBack);
+    m_headBack = style->Color(kHeadBack);
+    m_headText = style->Color(kHeadText);
+  }
+  ApplyStyle(style);
+  Colors c = GetColors();
+  c.back = m_evenRow;
+  c.empty = m_evenRow;
+  c.text = m_cellText;
+  c.headBack = m_headBack;
+  c.headText = m_headText;
+  if (style) c.gridLine = style->Color(kFrame);
+  SetColors(c);
+}
+
+void CInstrumentGrid::Reset() {
+  SetNumberRows(0);
+  ClearSelection();
+}
+
+void CInstrumentGrid::Redraw() { viewport()->update(); }
+
+QString CInstrumentGrid::dumpTsv() const {
+  // GetCell asks the derived grid for each cell, which is not const.
+  auto* self = const_cast<CInstrumentGrid*>(this);
+  const int cols = GetNumberCols();
+  QString out;
+  auto line = [&](int row) {
+    QString text;
+    bool first = true;
+    for (int col = 0; col < cols; ++col) {
+      if (GetColWidth(col) <= 0) continue;  // hidden
+      CGridCell cell;
+      self->GetCell(col, row, cell);
+      if (!first) text += QLatin1Char('\t');
+      text += DumpCell(cell.text);
+      first = false;
+    }
+    out += text;
+    out += QLatin1Char('\n');
+  };
+  line(kHeading);
+  for (int row = 0; row < GetNumberRows(); ++row) line(row);
+  return out;
+}
+
+void CInstrumentGrid::paintEvent(QPaintEvent* e) {
+  CGridCtrl::paintEvent(e);
+  if (m_message.empty()) return;
+  QPainter p(viewport());
+  const int top = GetTH_Height() + GetNumberRows() * GetDefRowHeight() + 8;
+  const QRect area(8, top, viewport()->width() - 16, std::max(0, viewport()->height() - top - 8));
+  if (area.height() <= 0 || area.width() <= 0) return;
+  p.setFont(GetDefFont());
+  p.setPen(m_cellText);
+  p.drawText(area, Qt::AlignHCenter | Qt::AlignTop | Qt::TextWordWrap, QString::fromStdWString(m_message));
+}
