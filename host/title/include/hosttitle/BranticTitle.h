@@ -25,10 +25,11 @@ class HV_API CBranticTitle : public QObject {
   explicit CBranticTitle(QObject* parent = nullptr);
   ~CBranticTitle() override;
 
-  // Puts the bar on `window`. A top-level window loses its system frame
-  // (unless SetMDIChild was called: a child window keeps its place in its
-  // parent and is moved within it). False when `window` is null; a second call
-  // moves the bar to the new window.
+  // Puts the bar on `window`; call it before the window is shown. A top-level
+  // window loses its system frame, and with it resizing by the frame (unless
+  // SetMDIChild was called: a child window keeps its place in its parent and
+  // is moved within it). False when `window` is null; a second call moves the
+  // bar to the new window.
   bool SubClassWnd(QWidget* window);
   QWidget* GetWindow() const { return m_window; }
   void SetMDIChild(bool isChild = true) { m_mdiChild = isChild; }
