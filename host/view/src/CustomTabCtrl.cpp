@@ -29,6 +29,7 @@ CCustomTabCtrl::CCustomTabCtrl(QWidget* parent, unsigned style, int notifyId)
   setFocusPolicy(Qt::StrongFocus);
   setMouseTracking(false);
   setAttribute(Qt::WA_OpaquePaintEvent);
+  setSizePolicy(QSizePolicy::Expanding, QSizePolicy::Fixed);
 }
 
 CCustomTabCtrl::~CCustomTabCtrl() = default;
@@ -501,6 +502,9 @@ bool CCustomTabCtrl::event(QEvent* event) {
 
 void CCustomTabCtrl::resizeEvent(QResizeEvent* event) {
   QWidget::resizeEvent(event);
+  // Scroll no further than the current item needs at the new width.
+  m_first = 0;
+  EnsureVisible(m_cur);
   if (IsEditing()) m_editor->setGeometry(GetItemRect(m_editItem).adjusted(2, 2, -2, -2));
 }
 

@@ -217,6 +217,13 @@ TEST_F(TabCtrlTest, ManyTabsScrollToKeepTheCurrentVisible) {
   tabs->SetCurSel(0);
   EXPECT_FALSE(tabs->GetItemRect(0).isEmpty());
   EXPECT_EQ(tabs->HitTest(tabs->GetItemRect(0).center()), 0);
+
+  // Selected while still narrow, then widened: the first tabs come back.
+  tabs->resize(60, 26);
+  tabs->SetCurSel(3);
+  tabs->resize(3000, 26);
+  EXPECT_FALSE(tabs->GetItemRect(0).isEmpty());
+  EXPECT_FALSE(tabs->GetItemRect(3).isEmpty());
 }
 
 TEST_F(TabCtrlTest, StatusTextLeavesRoomAndHandlerMayRebuild) {
