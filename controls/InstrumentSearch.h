@@ -26,7 +26,8 @@ class InstrumentSearchIndex {
   std::size_t Size() const { return m_count; }
 
   // List positions matching `key` (already lowered), best first. An empty key
-  // gives every position in list order.
+  // gives every position in list order. Keeps scratch buffers between calls:
+  // one thread at a time.
   std::vector<int> Search(std::string_view key) const;
   // The group an instrument falls in for `key` (kNone: no match); a check
   // of single entries against the rules above.
@@ -39,21 +40,24 @@ class InstrumentSearchIndex {
   struct Column {
     std::string text;                 // lowered texts, each followed by '\0'
     std::vector<std::uint32_t> start;  // start[i]: offset of entry i; start[n] = text.size()
+    std::vector<std::uint64_t> mask;   // characters present in entry i (see CharBit)
+    std::vector<std::uint32_t> rank;   // entry i's place in byte order (equal texts, equal rank)
     std::string_view Entry(std::size_t i) const {
       return std::string_view(text).substr(start[i], start[i + 1] - start[i] - 1);
     }
   };
+  // A match to be ordered: by offset, then the entry's rank, then the list position.
   struct Hit {
+    std::uint64_t order;  // offset << 32 | rank
     int pos;
-    std::uint32_t offset;
   };
+  static void SortHits(std::vector<Hit>& hits);
+  static void RankColumn(Column& col);
+  static std::uint64_t MaskOf(std::string_view s);
   static void BuildColumn(Column& col, const std::vector<JInstrumentUnderlying>& list,
                           std::string JInstrumentUnderlying::*field);
-  // Calls hit(position, offset) for the first occurrence of `key` in every
-  // entry of `col`, in list order, skipping entries with skip[pos] set.
-  template <class F>
-  void Scan(const Column& col, std::string_view key, const std::vector<char>* skip, F&& hit) const;
-
+  mutable std::vector<int> m_nameStart1, m_nameIn1, m_symStart1, m_symIn1, m_exch;
+  mutable std::vector<Hit> m_nameStart, m_nameIn, m_symStart, m_symIn;
   bool m_built = false;
   std::size_t m_count = 0;
   Column m_names, m_symbols, m_exchanges;
