@@ -136,13 +136,38 @@ ViewDock* MainWindow::AddView(CSuperBaseView* view, const QString& className, co
       if (d->ClassName() == className && d->Instance() == instance) { taken = true; ++instance; break; }
   }
   auto* dock = new ViewDock(view, className, instance, this);
-  // Tab it with the newest dock of the same class, else put it on the right.
+  // Tab it with the newest dock of the same class. Otherwise it gets a place of
+  // its own in its side of the window, up to three per side; beyond that it is
+  // tabbed with the last one so no view is squeezed to nothing.
+  static const QStringList kLeft = {"CPriceViewAdv", "CInsExpViewEx", "CPriceAlertList", "CNewPriceAlertAdv"};
+  const Qt::DockWidgetArea area = kLeft.contains(className) ? Qt::LeftDockWidgetArea : Qt::RightDockWidgetArea;
   ViewDock* sibling = nullptr;
   for (ViewDock* d : Docks())
     if (d->ClassName() == className && !d->isFloating()) sibling = d;
-  const bool left = className == "CPriceViewAdv" || className == "CInsExpViewEx";
-  addDockWidget(left ? Qt::LeftDockWidgetArea : Qt::RightDockWidgetArea, dock);
-  if (sibling) tabifyDockWidget(sibling, dock);
+  std::vector<ViewDock*> heads;  // one dock per place in the area
+  for (ViewDock* d : Docks()) {
+    if (d->isFloating() || dockWidgetArea(d) != area) continue;
+    bool grouped = false;
+    for (ViewDock* h : heads)
+      if (tabifiedDockWidgets(h).contains(d)) grouped = true;
+    if (!grouped) heads.push_back(d);
+  }
+  if (!sibling && heads.size() >= 3) sibling = heads.back();
+  addDockWidget(area, dock, Qt::Vertical);
+  if (sibling) {
+    tabifyDockWidget(sibling, dock);
+  } else {
+    QList<QDockWidget*> column(heads.begin(), heads.end());
+    column << dock;
+    QList<int> heights;
+    for (int i = 0; i < column.size(); ++i) heights << std::max(200, height() / static_cast<int>(column.size()));
+    resizeDocks(column, heights, Qt::Vertical);
+    if (heads.empty()) {
+      // A side's first view: the two sides share the width.
+      QList<QDockWidget*> row{dock};
+      resizeDocks(row, {width() / 2}, Qt::Horizontal);
+    }
+  }
   m_docks.push_back(dock);
   connect(dock, &ViewDock::closing, this, &MainWindow::OnDockClosing);
   connect(dock, &ViewDock::dropped, this, [this](ViewDock* d, const QString& source, const QString& link) {

@@ -364,7 +364,15 @@ int TerminalApp::Snapshot(const std::string& dir, std::string& error) {
   int files = 0;
   auto save = [&](QWidget* w, const QString& name) -> bool {
     const QString path = out.filePath(name + ".png");
-    if (!w->grab().save(path, "PNG")) {
+    QPixmap pixmap = w->grab();
+    if (pixmap.isNull()) {
+      // A view squeezed to nothing by the layout is drawn at a readable size on its own.
+      const QSize size = w->size();
+      w->resize(w->size().expandedTo(QSize(640, 400)));
+      pixmap = w->grab();
+      w->resize(size);
+    }
+    if (!pixmap.save(path, "PNG")) {
       error = "cannot write " + path.toStdString();
       return false;
     }

@@ -490,8 +490,9 @@ void CNewsView::InstrumentChanged() {
   const auto& q = m->QuoteOf(m_instrument);
   const QString name = QString::fromStdString(ins->instrumentName);
   Add(QString::fromStdString(m->TimeText()),
-      QString("%1 (%2, %3): previous close %4, opened at %5")
-          .arg(name, QString::fromStdString(ins->exchangeCode), QString::fromStdString(ins->sector),
+      QString("%1 (%2%3): previous close %4, opened at %5")
+          .arg(name, QString::fromStdString(ins->exchangeCode),
+               ins->sector.empty() ? QString() : ", " + QString::fromStdString(ins->sector),
                Price(m_instrument, q.close), Price(m_instrument, q.open)));
   m_lastHigh = q.high;
   m_lastLow = q.low;
