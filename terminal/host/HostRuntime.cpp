@@ -194,10 +194,25 @@ struct HostRuntime::Impl {
     std::string code, field;
     std::int32_t param = 0, kind = 0;
     std::vector<std::string> last;  // last value sent; one per level for depth
+    std::uint32_t dependsOn = 0;    // market change bits that can move this value
     bool alive = true;
   };
   std::vector<Sub> subs;
   std::vector<std::size_t> freeSubs;
+  // Which market changes can move a field, so that a quote move does not
+  // re-format the day figures of every subscription.
+  static std::uint32_t DependsOn(const std::string& f, std::int32_t kind) {
+    using M = sim::Market;
+    if (kind == 1) return M::kBookChanged;
+    if (kind != 0) return M::kTradeChanged | M::kBookChanged;
+    if (f == "BID" || f == "ASK" || f == "BVOL" || f == "SVOL" || f == "BUY" || f == "SELL" || f == "ORDS_BVOL" ||
+        f == "ORDS_SVOL")
+      return M::kBookChanged;
+    if (f == "CLOSE" || f == "REMARKS" || f == "CFD_STATUS" || f == "DMA_STATUS" || f == "MONTH" || f == "YEAR" ||
+        f == "INSTRNAME")
+      return 0;  // fixed for the session
+    return M::kTradeChanged;
+  }
   using SubKey = std::tuple<CSuperBaseView*, int, std::string, std::int32_t, std::int32_t>;
   std::map<SubKey, std::size_t> subIndex;
   std::unordered_map<int, std::vector<std::size_t>> subsByInstrument;
@@ -339,6 +354,7 @@ void HostRuntime::Impl::Subscribe(CSuperBaseView* v, const FieldRequest& r, int 
     s = Sub{};
     s.view = v; s.instrument = idx; s.productId = r.productId; s.code = r.instrumentCode;
     s.field = r.fieldName; s.param = r.param; s.kind = r.kind;
+    s.dependsOn = DependsOn(r.fieldName, r.kind);
     subIndex.emplace(key, k);
     subsByInstrument[idx].push_back(k);
     market->AddInterest(idx);
@@ -444,15 +460,15 @@ void HostRuntime::Impl::HandleField(CSuperBaseView* v, UINT msg, const FieldRequ
 }
 
 void HostRuntime::Impl::CollectPushes(std::vector<std::pair<CSuperBaseView*, FieldUpdate>>& out) {
-  const std::vector<int> changed = market->TakeChanged();
-  for (int idx : changed) {
+  const auto changed = market->TakeChangedWithBits();
+  for (const auto& [idx, bits] : changed) {
     auto it = subsByInstrument.find(idx);
     if (it == subsByInstrument.end()) continue;
     std::vector<sim::DepthLevel> book;  // computed once per instrument and tick
     int bookLevels = 0;
     for (std::size_t k : it->second) {
       Sub& s = subs[k];
-      if (!s.alive) continue;
+      if (!s.alive || !(s.dependsOn & bits)) continue;
       if (s.kind == 1) {
         const int levels = std::clamp(s.param, 1, int(sim::Market::kDepthLevels));
         if (levels > bookLevels) { book = market->Book(idx, levels); bookLevels = levels; }

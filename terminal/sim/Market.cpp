@@ -294,9 +294,10 @@ struct Market::Impl {
     return std::round(p * scale) / scale;
   }
 
-  void MarkDirty(int base) {
+  void MarkDirty(int base, std::uint8_t bits) {
     auto mark = [&](int k) {
-      if (!dirty[k]) { dirty[k] = 1; dirtyList.push_back(k); }
+      if (!dirty[k]) dirtyList.push_back(k);
+      dirty[k] |= bits;
     };
     mark(base);
     auto it = aliasesOf.find(base);
@@ -683,6 +684,7 @@ void Market::Impl::Event(int i, Rng& r) {
     Trade t = NextTrade(i, s, r, TimeOfDay());
     ApplyTrade(i, s, t, r);
     tapes[i].push_back(t);
+    MarkDirty(i, kBookChanged | kTradeChanged);
   } else {
     // Quote-only move: sizes change, now and then a level is added or pulled.
     const double u = r.Uniform();
@@ -700,8 +702,8 @@ void Market::Impl::Event(int i, Rng& r) {
     if (r.Chance(0.5)) s.bidVol = std::max<std::int64_t>(inf.lot, s.bidVol + std::int64_t(inf.lot) * r.Range(-40, 60));
     else s.askVol = std::max<std::int64_t>(inf.lot, s.askVol + std::int64_t(inf.lot) * r.Range(-40, 60));
     ++s.version;
+    MarkDirty(i, kBookChanged);
   }
-  MarkDirty(i);
 }
 
 void Market::Impl::StepOnce() {
@@ -842,6 +844,19 @@ std::vector<int> Market::TakeChanged() {
   out.swap(d->dirtyList);
   for (int i : out) d->dirty[i] = 0;
   std::sort(out.begin(), out.end());
+  return out;
+}
+
+std::vector<std::pair<int, std::uint32_t>> Market::TakeChangedWithBits() {
+  std::vector<int> list;
+  list.swap(d->dirtyList);
+  std::sort(list.begin(), list.end());
+  std::vector<std::pair<int, std::uint32_t>> out;
+  out.reserve(list.size());
+  for (int i : list) {
+    out.emplace_back(i, d->dirty[i]);
+    d->dirty[i] = 0;
+  }
   return out;
 }
 

@@ -128,8 +128,13 @@ class Market {
   void RemoveInterest(int index);
   int InterestCount() const;
 
+  // What changed about an instrument: its book (bid, ask, sizes, levels) or
+  // its trades (last, day figures, tape, summary; a trade moves the book too).
+  enum ChangeBits : std::uint32_t { kBookChanged = 1, kTradeChanged = 2 };
   // Instruments whose values changed since the last call, sorted, each once.
   std::vector<int> TakeChanged();
+  // The same with what changed about each.
+  std::vector<std::pair<int, std::uint32_t>> TakeChangedWithBits();
 
   // ---- Values ---------------------------------------------------------------------
   Quote QuoteOf(int index);

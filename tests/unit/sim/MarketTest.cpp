@@ -134,8 +134,9 @@ TEST(Market, QuotesStayCoherentWithTheTape) {
   // A twin (CFD, DMA, brand) shows its underlying's market.
   for (int k = 0; k < int(m.Instruments().size()); ++k) {
     const auto& r = m.Instruments()[k];
-    if (k != i && r.exchangeCode == m.Instruments()[i].exchangeCode && r.instrumentCode.find(m.Instruments()[i].instrumentCode) != std::string::npos)
+    if (k != i && r.exchangeCode == m.Instruments()[i].exchangeCode && r.instrumentCode.find(m.Instruments()[i].instrumentCode) != std::string::npos) {
       EXPECT_EQ(m.FieldValue(k, "LAST", 0, 0), m.FieldValue(i, "LAST", 0, 0)) << r.instrumentCode;
+    }
   }
 }
 
@@ -150,7 +151,7 @@ TEST(Market, BookHas99OrderedLevelsAroundTheBestPrices) {
   EXPECT_EQ(book[0].bidVolume, q.bidVolume);
   for (std::size_t k = 1; k < book.size(); ++k) {
     EXPECT_GT(book[k].ask, book[k - 1].ask);
-    if (book[k].bid > 0) EXPECT_LT(book[k].bid, book[k - 1].bid);
+    if (book[k].bid > 0) { EXPECT_LT(book[k].bid, book[k - 1].bid); }
     if (book[k].bidVolume > 0) {
       EXPECT_GE(book[k].bidOrders, 1);
       EXPECT_LE(book[k].bidOrders, book[k].bidVolume);
@@ -221,7 +222,7 @@ TEST(Market, SummaryPagesHoldFortyLinesAndTotals) {
     EXPECT_EQ(all[line].price, m.FormatPrice(i, l.price));
     EXPECT_EQ(all[line].volume, std::to_string(l.volume));
     EXPECT_EQ(std::stoll(all[line].bid) + std::stoll(all[line].ask) <= l.volume, true);
-    if (line > 1) EXPECT_LT(l.price, lines[std::size_t(line - 2)].price) << "highest price first";
+    if (line > 1) { EXPECT_LT(l.price, lines[std::size_t(line - 2)].price) << "highest price first"; }
     vol += l.volume;
     trades += l.trades;
   }
