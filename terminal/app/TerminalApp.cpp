@@ -110,7 +110,10 @@ bool TerminalApp::Start(std::string& error) {
   connect(w, &MainWindow::viewClosing, this, [this](CSuperBaseView* v) { m_runtime->DestroyView(v, false); });
   connect(w, &MainWindow::styleRequested, this, &TerminalApp::ChangeStyle);
   connect(w, &MainWindow::languageReloadRequested, this, [this] {
-    GetUserSettings().GetWatchlistSetting();  // nothing cached here; the views re-read
+    // Column headings and font-size names come from the language table too.
+    CWatchlistSetting watchlist = GetUserSettings().GetWatchlistSetting();
+    watchlist.RefreshLanguage(&m_runtime->Language());
+    if (!(watchlist == GetUserSettings().GetWatchlistSetting())) GetUserSettings().SetWatchlistSetting(watchlist);
     m_runtime->ApplyLanguage();
   });
   connect(w, &MainWindow::fontSizeRequested, this, &TerminalApp::ShowFontSize);

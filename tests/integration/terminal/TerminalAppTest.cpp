@@ -8,9 +8,16 @@
 #include <QVBoxLayout>
 #include <filesystem>
 
+#include "hostview/SuperBaseView.h"
+#include "platform/Platform.h"
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
+#include "terminal/app/MainWindow.h"
 #include "terminal/app/Options.h"
+#include "terminal/app/TerminalApp.h"
+#include "terminal/host/HostRuntime.h"
+#include "terminal/sim/Market.h"
+#include "terminal/store/Store.h"
 
 namespace {
 
@@ -145,6 +152,126 @@ TEST(AddonLoader, RefusesWhatIsNotAnAddon) {
   EXPECT_NE(loader.Find("CPriceViewAdv"), nullptr);
   EXPECT_EQ(loader.Find("cpriceviewadv"), nullptr);
   EXPECT_EQ(loader.Find(""), nullptr);
+}
+
+// ---- The application in-process, with the terminal's own views only ----------
+
+namespace {
+
+struct TempDir {
+  std::filesystem::path path;
+  TempDir() {
+    std::string tmpl = (std::filesystem::temp_directory_path() / "term_app_XXXXXX").string();
+    path = mkdtemp(tmpl.data());
+  }
+  ~TempDir() { std::filesystem::remove_all(path); }
+};
+
+term::Options SmallRun() {
+  term::Options o;
+  o.headless = true;
+  o.seconds = 1;
+  o.instruments = 100;
+  o.seed = 5;
+  return o;
+}
+
+std::unique_ptr<term::Store> OpenStore(const std::filesystem::path& dir) {
+  term::StoreOpenReport report;
+  std::string error;
+  auto store = term::Store::Open(dir, report, error);
+  EXPECT_TRUE(store) << error;
+  return store;
+}
+
+}  // namespace
+
+TEST(TerminalLayout, DocksTabsFloatingAndStartParametersComeBack) {
+  App();
+  platform::UseVirtualClock();
+  TempDir dir;
+  term::AddonLoader noAddon;  // not loaded: only the terminal's own classes exist
+  std::string error;
+  std::string code;
+  std::int64_t pid = 0;
+  {
+    auto store = OpenStore(dir.path);
+    term::TerminalApp app(SmallRun(), noAddon, store.get());
+    term::Options o = SmallRun();
+    ASSERT_TRUE(app.Start(error)) << error;
+    const auto& ins = app.Runtime().Market().Instruments().at(3);
+    pid = ins.productId;
+    code = ins.instrumentCode;
+    CSuperBaseView* news = app.OpenView("CFNews", pid, code, {}, {}, error);
+    CSuperBaseView* trade1 = app.OpenView("CTradeView", -1, {}, {}, {}, error);
+    CSuperBaseView* trade2 = app.OpenView("CTradeView", -1, {}, {}, {}, error);
+    CSuperBaseView* explorer = app.OpenView("CInsExpViewEx", -1, {}, {}, {}, error);
+    ASSERT_TRUE(news && trade1 && trade2 && explorer) << error;
+    EXPECT_EQ(app.OpenView("CNoSuchView", -1, {}, {}, {}, error), nullptr);
+    EXPECT_NE(error.find("CNoSuchView"), std::string::npos);
+
+    term::MainWindow& w = app.Window();
+    // Same class: tabbed together. Then one floats.
+    EXPECT_TRUE(w.tabifiedDockWidgets(w.DockOf(trade1)).contains(w.DockOf(trade2)));
+    w.DockOf(explorer)->setFloating(true);
+    EXPECT_EQ(w.DockOf(trade2)->objectName(), "dock-CTradeView-2");
+    w.ActivateView(news);
+    EXPECT_EQ(w.ActiveView(), news);
+    ASSERT_TRUE(app.SaveLayout());
+    app.Shutdown();
+    EXPECT_TRUE(w.Docks().empty());
+  }
+  {
+    auto store = OpenStore(dir.path);
+    term::TerminalApp app(SmallRun(), noAddon, store.get());
+    ASSERT_TRUE(app.Start(error)) << error;
+    term::MainWindow& w = app.Window();
+    const auto docks = w.Docks();
+    std::vector<std::string> names;
+    for (auto* d : docks) names.push_back(d->objectName().toStdString());
+    EXPECT_EQ(names, (std::vector<std::string>{"dock-CFNews-1", "dock-CTradeView-1", "dock-CTradeView-2",
+                                               "dock-CInsExpViewEx-1"}));
+    ASSERT_EQ(docks.size(), 4u);
+    EXPECT_TRUE(docks[3]->isFloating());
+    EXPECT_FALSE(docks[1]->isFloating());
+    EXPECT_TRUE(w.tabifiedDockWidgets(docks[1]).contains(docks[2]));
+    EXPECT_EQ(w.ActiveView(), docks[0]->View());
+    // The news view is back on its instrument, and says so in its title.
+    EXPECT_EQ(docks[0]->View()->GetStartProductId(), pid);
+    EXPECT_EQ(docks[0]->View()->GetStartInstrumentCode(), code);
+    EXPECT_TRUE(docks[0]->windowTitle().startsWith("News - ")) << docks[0]->windowTitle().toStdString();
+
+    // Re-docking a floating view.
+    docks[3]->setFloating(false);
+    EXPECT_FALSE(docks[3]->isFloating());
+    app.Shutdown();
+  }
+}
+
+TEST(TerminalLayout, StyleChoiceIsKeptForTheNextStart) {
+  App();
+  platform::UseVirtualClock();
+  TempDir dir;
+  term::AddonLoader noAddon;
+  std::string error;
+  {
+    auto store = OpenStore(dir.path);
+    term::TerminalApp app(SmallRun(), noAddon, store.get());
+    ASSERT_TRUE(app.Start(error)) << error;
+    CSuperBaseView* v = app.OpenView("CStockAnalytics", -1, {}, {}, {}, error);
+    ASSERT_TRUE(v);
+    const QColor light = v->palette().color(QPalette::Window);
+    emit app.Window().styleRequested(2);
+    EXPECT_EQ(v->GetStyleID(), 2);
+    EXPECT_NE(v->palette().color(QPalette::Window), light) << "the view takes the dark style's colours";
+    app.Shutdown();
+  }
+  auto store = OpenStore(dir.path);
+  EXPECT_EQ(store->LoadSettings("ui.").at("style"), "2");
+  term::TerminalApp app(SmallRun(), noAddon, store.get());
+  ASSERT_TRUE(app.Start(error)) << error;
+  EXPECT_EQ(app.Runtime().Styles().GetStyleID(), 2);
+  app.Shutdown();
 }
 
 #include "TerminalAppTest.moc"
