@@ -2,6 +2,8 @@
 
 #include <QApplication>
 #include <QLinearGradient>
+#include <QLocale>
+#include <cmath>
 #include <QPainterPath>
 #include <QStyle>
 #include <mutex>
@@ -29,6 +31,19 @@ std::mutex& TileLock() {
 
 QString Q(const std::wstring& s) { return QString::fromStdWString(s); }
 QString Q(const std::string& s) { return QString::fromUtf8(s.data(), qsizetype(s.size())); }
+
+// Volumes on a tile are read at a glance: whole numbers with separators, and
+// millions or billions shortened.
+QString TileVolume(const QuoteCell& cell) {
+  if (cell.text.empty()) return {};
+  const double v = cell.value;
+  if (!std::isfinite(v)) return Q(cell.text);
+  const double a = std::fabs(v);
+  if (a >= 1e9) return QString::number(v / 1e9, 'f', 2) + QLatin1Char('B');
+  if (a >= 1e6) return QString::number(v / 1e6, 'f', 2) + QLatin1Char('M');
+  if (a != std::floor(a)) return QLocale(QLocale::English).toString(v, 'f', 2);
+  return QLocale(QLocale::English).toString(static_cast<qlonglong>(v));
+}
 
 QColor Mix(const QColor& a, const QColor& b, double t) {
   return QColor(int(a.red() * (1 - t) + b.red() * t), int(a.green() * (1 - t) + b.green() * t),
@@ -275,6 +290,7 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
   const Box bodyBox = AreaBox(rect, kBody);
   const QRect bodyR = bodyBox.ToRect();
   p.save();
+  p.setBrush(Qt::NoBrush);
   p.fillRect(bodyR, body);
   p.setPen(selected ? Mix(head, QColor(255, 160, 0), 0.7) : frame);
   p.drawRect(bodyR.adjusted(0, 0, -1, -1));
@@ -311,13 +327,34 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
       p.setFont(f);
       p.setPen(head);
       p.drawText(badge, Qt::AlignCenter, Q(type).left(3));
+      p.setBrush(Qt::NoBrush);
     }
     x = badge.right() + 5;
   }
   const Box tb = AreaBox(rect, kTitleButton);
+  int nameRight = tb.l - 4;
+  {
+    // The market delay, when there is one, sits before the remove button.
+    const QString delay = MarketDelay(ins.productId, ins.exchangeCode);
+    if (!delay.isEmpty()) {
+      p.setFont(small);
+      const QString t = Caption(205) + QLatin1Char(' ') + delay;
+      const int w = p.fontMetrics().horizontalAdvance(t) + 8;
+      const QRect badge(nameRight - w, title.top() + 3, w, title.height() - 6);
+      p.setRenderHint(QPainter::Antialiasing, true);
+      p.setPen(Qt::NoPen);
+      p.setBrush(QColor(240, 160, 40));
+      p.drawRoundedRect(QRectF(badge).adjusted(0.5, 0.5, -0.5, -0.5), 3, 3);
+      p.setRenderHint(QPainter::Antialiasing, false);
+      p.setPen(QColor(40, 30, 10));
+      p.drawText(badge, Qt::AlignCenter, t);
+      p.setBrush(Qt::NoBrush);
+      nameRight = badge.left() - 4;
+    }
+  }
   p.setFont(bold);
   p.setPen(headText);
-  const QRect nameRect(x, title.top(), tb.l - 4 - x, title.height());
+  const QRect nameRect(x, title.top(), nameRight - x, title.height());
   p.drawText(nameRect, Qt::AlignVCenter | Qt::AlignLeft,
              p.fontMetrics().elidedText(Q(hv::Widen(ins.instrumentName)).trimmed(), Qt::ElideRight, nameRect.width()));
   {
@@ -348,16 +385,18 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
     else PArrowButtonTypeEx::DrawInfoGlyph(p, inner, QColor(40, 110, 190));
     const QString code = Q(hv::Widen(ins.displayCode.empty() ? ins.symbol : ins.displayCode)).trimmed();
     const QString exch = Q(hv::Widen(ins.exchangeCode)).trimmed();
-    const QString delay = MarketDelay(ins.productId, ins.exchangeCode);
     p.setFont(base);
     p.setPen(text);
     const QRect codeRect(b.right() + 5, second.top(), second.width() - b.width() - 10, second.height());
     p.drawText(codeRect, Qt::AlignVCenter | Qt::AlignLeft, code + QStringLiteral("  ") + exch);
-    if (!delay.isEmpty()) {
+    const QString vol = TileVolume(quote[QuoteLayout::Vol]);
+    if (!vol.isEmpty()) {
       p.setFont(small);
-      p.setPen(QColor(190, 110, 0));
-      p.drawText(codeRect.adjusted(0, 0, -2, 0), Qt::AlignVCenter | Qt::AlignRight,
-                 Caption(205) + QLatin1Char(' ') + delay);
+      const int w = p.fontMetrics().horizontalAdvance(vol);
+      p.setPen(text);
+      p.drawText(codeRect.adjusted(0, 0, -2, 0), Qt::AlignVCenter | Qt::AlignRight, vol);
+      p.setPen(muted);
+      p.drawText(codeRect.adjusted(0, 0, -w - 6, 0), Qt::AlignVCenter | Qt::AlignRight, Caption(203));
     }
   }
 
@@ -373,10 +412,8 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
   const QColor signColor = chg.value > 0 ? up : chg.value < 0 ? down : text;
   p.setFont(big);
   p.setPen(signColor);
-  p.drawText(lastRect, Qt::AlignVCenter | Qt::AlignLeft, Q(last.text));
+  p.drawText(lastRect.adjusted(0, 0, -lastRect.width() / 3, 0), Qt::AlignVCenter | Qt::AlignLeft, Q(last.text));
   {
-    p.setFont(bold);
-    p.setPen(signColor);
     QString change = Q(chg.text);
     if (chg.value > 0 && !change.startsWith(QLatin1Char('+'))) change.prepend(QLatin1Char('+'));
     QString pct = Q(pchg.text);
@@ -385,7 +422,14 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
       pct += QLatin1Char('%');
     }
     const QString arrow = chg.value > 0 ? QStringLiteral("\u25B2 ") : chg.value < 0 ? QStringLiteral("\u25BC ") : QString();
-    p.drawText(lastRect, Qt::AlignVCenter | Qt::AlignRight, arrow + change + (pct.isEmpty() ? QString() : QStringLiteral("  ") + pct));
+    // Change over percentage at the right; the price keeps the rest.
+    p.setFont(bold);
+    p.setPen(signColor);
+    const QRect upper(lastRect.left(), lastRect.top(), lastRect.width(), lastRect.height() / 2 + 1);
+    const QRect lower(lastRect.left(), upper.bottom(), lastRect.width(), lastRect.height() - upper.height());
+    p.drawText(upper, Qt::AlignVCenter | Qt::AlignRight, arrow + change);
+    p.setFont(small);
+    p.drawText(lower, Qt::AlignVCenter | Qt::AlignRight, pct);
   }
 
   // Bid and ask: the trading parts.
@@ -403,7 +447,7 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
     const QRect top(box.left() + 4, box.top() + 1, box.width() - 8, 13);
     p.drawText(top, Qt::AlignVCenter | Qt::AlignLeft, Caption(bid ? 201 : 202));
     p.setPen(muted);
-    p.drawText(top, Qt::AlignVCenter | Qt::AlignRight, Q(vol.text));
+    p.drawText(top, Qt::AlignVCenter | Qt::AlignRight, TileVolume(vol));
     p.setFont(bold);
     p.setPen(text);
     p.drawText(QRect(box.left() + 4, box.top() + 13, box.width() - 8, box.height() - 14),
@@ -416,19 +460,18 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
     const int y = AreaBox(rect, kBidBox).b + 2;
     const QRect line(bodyR.left() + 6, y, bodyR.width() - 12, std::max(12, bar.t - 1 - y));
     p.setFont(small);
-    const int third = line.width() / 3;
+    const int half = line.width() / 2;
     const auto pair = [&](int i, const QString& caption, const QString& value) {
-      const QRect r(line.left() + i * third, line.top(), third - 4, line.height());
+      const QRect r(line.left() + i * half, line.top(), half - 4, line.height());
       p.setPen(muted);
       p.drawText(r, Qt::AlignVCenter | Qt::AlignLeft, caption);
-      const int w = p.fontMetrics().horizontalAdvance(caption) + 3;
+      const int w = p.fontMetrics().horizontalAdvance(caption) + 4;
       p.setPen(text);
       p.drawText(r.adjusted(w, 0, 0, 0), Qt::AlignVCenter | Qt::AlignLeft,
                  p.fontMetrics().elidedText(value, Qt::ElideRight, std::max(0, r.width() - w)));
     };
     pair(0, QStringLiteral("High:"), Q(quote[QuoteLayout::High].text));
     pair(1, QStringLiteral("Low:"), Q(quote[QuoteLayout::Low].text));
-    pair(2, Caption(203) + QLatin1Char(':'), Q(quote[QuoteLayout::Vol].text));
   }
 
   // Bottom bar: quantity caption, field and list button.
