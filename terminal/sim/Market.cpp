@@ -333,9 +333,10 @@ void Market::Impl::AddInstrument(JInstrumentUnderlying rec, InstInfo inf) {
 
 void Market::Impl::Build() {
   products = {
-      {101, "ES", "Equities"}, {102, "CS", "Cash Securities"}, {103, "CFD", "Contracts for Difference"},
-      {104, "FUT", "Futures"}, {105, "FX", "Foreign Exchange"}, {106, "DMA", "Direct Market Access"},
+      {101, "ES", "Equities", ""}, {102, "CS", "Cash Securities", ""}, {103, "CFD", "Contracts for Difference", ""},
+      {104, "FUT", "Futures", ""}, {105, "FX", "Foreign Exchange", ""}, {106, "DMA", "Direct Market Access", ""},
   };
+  for (JProduct& p : products) p.pictureFile = ".\\images\\Products\\" + p.productType + ".bmp";
   for (const ExchangeDef& e : kExchanges) exchanges.push_back({e.code, e.market, e.name, e.product});
   for (const SectorDef& s : kSectors) sectors.push_back({s.code, s.name});
   for (const ExchangeDef& e : kExchanges) {

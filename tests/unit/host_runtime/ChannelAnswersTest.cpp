@@ -88,6 +88,10 @@ TEST(HostChannel, DeliversReferenceAndWatchlistLists) {
   EXPECT_EQ(v.notes.back().count, h.runtime->Market().Exchanges().size());
   v.Send(hm::ProductList);
   EXPECT_EQ(v.notes.back().count, 6u);
+  for (const JProduct& p : h.runtime->Market().Products()) {
+    const std::wstring file = h.runtime->Styles().ResolveImagePath(hv::Widen(p.pictureFile), 2);
+    EXPECT_FALSE(file.empty()) << p.pictureFile;
+  }
   v.Send(hm::WatchlistGroups521);
   ASSERT_FALSE(v.notes.back().groups.empty());
   EXPECT_EQ(v.notes.back().groups[0].groupName, "SGX");

@@ -66,6 +66,9 @@ struct JProduct {
   std::int64_t productId = 0;
   std::string productType;  // "ES", "CS", "CFD", "FUT", "FX", "DMA"
   std::string productName;
+  // The product's picture as a terminal image path (".\images\Products\ES.bmp");
+  // resolve it with IStyleManager::ResolveImagePath. Empty: no picture.
+  std::string pictureFile;
 };
 
 // One exchange, keyed by its code.
