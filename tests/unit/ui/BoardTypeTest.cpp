@@ -90,6 +90,11 @@ class BoardTest : public ::testing::Test {
             Ins("AAPL", "Apple", "NASDAQ", 3), Ins("0700", "Tencent", "HKEX", 1)};
     InstrumentMgr_ReadOnly().Fill(&list);
   }
+  void TearDown() override {
+    // The store indexes the list in place: leave it pointing at a list that lives on.
+    static const std::vector<JInstrumentUnderlying> none;
+    InstrumentMgr_ReadOnly().Fill(&none);
+  }
   static void Click(CGridCtrl& g, QPoint press, QPoint release) {
     QTest::mousePress(g.viewport(), Qt::LeftButton, {}, press);
     QTest::mouseRelease(g.viewport(), Qt::LeftButton, {}, release);
