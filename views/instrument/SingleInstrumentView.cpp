@@ -466,10 +466,15 @@ bool CSingleInstrumentView::HandleShortcutKey(int key, Qt::KeyboardModifiers mod
 bool CSingleInstrumentView::eventFilter(QObject* watched, QEvent* event) {
   if (event->type() == QEvent::KeyPress || event->type() == QEvent::ShortcutOverride) {
     auto* key = static_cast<QKeyEvent*>(event);
-    const bool inText = m_combo && watched == m_combo->lineEdit();
+    // The combo box passes on what its edit field does not take.
+    const bool inText = m_combo && (watched == m_combo->lineEdit() || watched == m_combo);
     bool mainKey = false;
     const ShortcutSide side = ShortcutOf(key->key(), key->modifiers(), &mainKey);
-    if (side != ShortcutSide::None && !(inText && mainKey)) {
+    if (side != ShortcutSide::None && inText && mainKey) {
+      // Text for the search box; should the box not take it, it must not come
+      // back to the view as a shortcut.
+      if (event->type() == QEvent::KeyPress) m_textKeyEvent = event;
+    } else if (side != ShortcutSide::None) {
       // Taken before any other shortcut of the terminal; acted on when pressed.
       if (event->type() == QEvent::KeyPress) HandleShortcutKey(key->key(), key->modifiers(), inText);
       event->accept();
@@ -480,7 +485,9 @@ bool CSingleInstrumentView::eventFilter(QObject* watched, QEvent* event) {
 }
 
 void CSingleInstrumentView::keyPressEvent(QKeyEvent* e) {
-  if (HandleShortcutKey(e->key(), e->modifiers())) {
+  const bool fromText = e == m_textKeyEvent;
+  m_textKeyEvent = nullptr;
+  if (HandleShortcutKey(e->key(), e->modifiers(), fromText)) {
     e->accept();
     return;
   }

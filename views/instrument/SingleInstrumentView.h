@@ -210,4 +210,5 @@ class CSingleInstrumentView : public CAddonView {
   std::string m_checkingExchange;  // the exchange of the pending 604
   const JInstrumentUnderlying* m_linkAnswer = nullptr;  // answer to 550/551
   bool m_fromStartParams = false;
+  const QEvent* m_textKeyEvent = nullptr;  // a key typed into the search box
 };
