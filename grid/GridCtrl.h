@@ -7,6 +7,20 @@
 // Coordinates: data cells are (col >= 0, row >= 0). The top heading row is
 // row -1, the side heading column is col -1, the corner button is (-1, -1).
 // Rows share one height; columns have their own widths.
+//
+//   class DepthGrid : public CGridCtrl {
+//     DepthGrid() { SetNumberCols(6); SetDefRowHeight(21); SetTH_Height(21); }
+//     void OnGetCell(int col, int row, CGridCell& cell) override {
+//       if (row == -1) { cell.SetText(heading[col]); return; }
+//       cell.SetText(levelText(row, col));               // from the store, now
+//       cell.SetAlignment(Qt::AlignRight | Qt::AlignVCenter);
+//       cell.SetBackColor(row % 2 ? oddColor : evenColor);  // COLORREF or QColor
+//     }
+//     void OnLClicked(int col, int row, bool pressed, const QRect&, const QPoint&) override {
+//       if (!pressed && col >= 0 && row >= 0) ...;     // release on a data cell
+//     }
+//   };
+// A timer that sees new data calls RedrawAll(); only visible cells are asked for.
 #include <QAbstractScrollArea>
 #include <QFont>
 #include <QPointer>
