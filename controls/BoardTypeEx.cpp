@@ -30,7 +30,6 @@ std::mutex& TileLock() {
 }
 
 QString Q(const std::wstring& s) { return QString::fromStdWString(s); }
-QString Q(const std::string& s) { return QString::fromUtf8(s.data(), qsizetype(s.size())); }
 
 // Volumes on a tile are read at a glance: whole numbers with separators, and
 // millions or billions shortened.
