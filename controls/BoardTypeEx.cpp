@@ -305,11 +305,10 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
   {
     const auto product = ProductMgr().FindPtr(ins.productId);
     const std::wstring type = product ? hv::Widen(product->productType) : hv::Widen(ins.productType);
+    // The product record names its picture; a product without one shows its type.
+    const std::wstring picture = product ? hv::Widen(product->pictureFile) : std::wstring();
     QPixmap pm;
-    if (!type.empty()) {
-      auto& img = m_productImages.try_emplace(type, L"images/Product/[styleID]/" + type + L".bmp").first->second;
-      pm = img.Get(style, m_styleId);
-    }
+    if (!picture.empty()) pm = m_productImages.try_emplace(picture, picture).first->second.Get(style, m_styleId);
     const QRect badge(x, title.top() + 3, 22, title.height() - 6);
     if (!pm.isNull()) {
       p.drawPixmap(badge.topLeft(), pm.scaled(badge.size(), Qt::KeepAspectRatio, Qt::SmoothTransformation));

@@ -15,6 +15,7 @@
 #include "grid/GridDropList.h"
 #include "hostview/HostLists.h"
 #include "hostview/MessageIds.h"
+#include "hostview/Services.h"
 #include "hostview/SuperBaseView.h"
 
 namespace {
@@ -254,6 +255,47 @@ TEST_F(BoardTest, Board_DrawingLooksUpInstrumentsAndAsksForMarketDelayOnce) {
   // Quote records of the shown instruments were asked for (and queued).
   auto pending = QuoteStore::Instance().TakePending(0);
   EXPECT_GE(pending.size(), 4u);
+}
+
+}  // namespace
+
+namespace {
+
+class PathRecordingStyle : public IStyleManager {
+ public:
+  mutable std::vector<std::pair<std::wstring, int>> asked;
+  int GetStyleID() const override { return 4; }
+  COLORREF GetColor(int) const override { return MakeColorRef(200, 200, 200); }
+  QFont GetFont(int) const override { return QFont(); }
+  std::wstring ResolveImagePath(const std::wstring& path, int styleId) const override {
+    asked.push_back({path, styleId});
+    return {};
+  }
+};
+
+TEST_F(BoardTest, Board_PicturesComeFromTheStyleForTheCurrentStyleId) {
+  ProductMgr().Fill(std::vector<JProduct>{{1, "ES", "Equities", ".\\images\\Products\\ES.bmp"}});
+  PathRecordingStyle style;
+  BoardGridForTest g(1);
+  g.board.SetStyleManager(&style, 4);
+  g.show();
+  QImage img(g.viewport()->size(), QImage::Format_ARGB32_Premultiplied);
+  QPainter p(&img);
+  g.PaintTo(p, img.rect());
+  const auto has = [&](const std::wstring& path, int id) {
+    return std::find(style.asked.begin(), style.asked.end(), std::pair{path, id}) != style.asked.end();
+  };
+  EXPECT_TRUE(has(L".\\images\\Products\\ES.bmp", 4));
+  EXPECT_TRUE(has(PBoardTypeEx::kCompanyInfoPicture, 4));
+  // Looked up once per style, again after a style change.
+  const std::size_t n = style.asked.size();
+  g.PaintTo(p, img.rect());
+  EXPECT_EQ(style.asked.size(), n);
+  g.board.ChangeStyle(5);
+  g.PaintTo(p, img.rect());
+  EXPECT_TRUE(has(PBoardTypeEx::kCompanyInfoPicture, 5));
+  p.end();
+  ProductMgr().Fill(std::vector<JProduct>{});
 }
 
 }  // namespace
