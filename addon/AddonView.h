@@ -36,6 +36,7 @@
 #include <string>
 #include <vector>
 
+#include "addon/Channel.h"
 #include "addon/Registries.h"
 #include "addon/StoreStatus.h"
 #include "hostview/MessageIds.h"
@@ -110,6 +111,10 @@ class CAddonView : public CSuperBaseView, public platform::TimerHandler, public 
   bool QueryAltStatus();
 
   // ---- Helpers ----
+  // This view's SendChildFeedback as a sender for the field batch helpers.
+  addon::FeedbackSender Sender() {
+    return [this](UINT message, LPARAM data) { SendChildFeedback(message, data); };
+  }
   // Language text of section 13; empty without a language service.
   std::wstring LanguageText(int entry) const;
   // Stores `title` (GetTitle) and sends it with 101.
