@@ -2,7 +2,10 @@
 // scripted host.
 #include <gtest/gtest.h>
 
+#include <algorithm>
+
 #include "addon/AddonView.h"
+#include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
 #include "mvtest/ScriptedHost.h"
 
@@ -177,6 +180,45 @@ TEST_F(AddonViewTest, Mend_NullPointersAndUnknownNumbersChangeNothing) {
   EXPECT_TRUE(host.Requests().empty());
   EXPECT_TRUE(view->LinkMode());
   EXPECT_TRUE(view->LastMessageText().empty());
+}
+
+}  // namespace
+
+namespace {
+
+// A view that counts its timer ticks and window messages.
+class CTickingView : public CTestView {
+ public:
+  void OnTimer(UINT id) override { ticks.push_back(id); }
+  LRESULT OnWindowMessage(UINT message, WPARAM, LPARAM lParam) override {
+    messages.push_back(message);
+    return lParam;
+  }
+  std::vector<UINT> ticks;
+  std::vector<UINT> messages;
+};
+
+TEST(ScriptedHost_Clock, AdvancingFiresDueTimersAndDeliversPosts) {
+  mvtest::ScriptedHost host;
+  auto* view = static_cast<CTickingView*>(host.Adopt(new CTickingView));
+  platform::SetTimer(view, 3001, 200);
+  platform::SetTimer(view, 3003, 1000);
+  host.Advance(199);
+  EXPECT_TRUE(view->ticks.empty());
+  host.Advance(1);
+  EXPECT_EQ(view->ticks, (std::vector<UINT>{3001}));
+  host.Advance(800);
+  EXPECT_EQ(std::count(view->ticks.begin(), view->ticks.end(), 3001u), 5);
+  EXPECT_EQ(std::count(view->ticks.begin(), view->ticks.end(), 3003u), 1);
+
+  const UINT trade = addon::Msg().wlOpenTrade;
+  EXPECT_EQ(platform::SendMessage(view, trade, 0, 5), 5);
+  platform::PostMessage(view, trade, 0, -1);
+  EXPECT_EQ(view->messages.size(), 1u);
+  host.Advance(0);
+  EXPECT_EQ(view->messages, (std::vector<UINT>{trade, trade}));
+  host.Destroy(view);  // timers die with the window
+  host.Advance(1000);
 }
 
 }  // namespace
