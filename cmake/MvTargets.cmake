@@ -22,6 +22,8 @@ endfunction()
 
 # mv_test(NAME <target> SOURCES ... DEPS ... LABELS ...)
 # One gtest executable; every test case runs in its own process (clean statics).
+# Tests find the build's lib/ and bin/ next to their own folder (<build>/tests);
+# MV_ADDON and MV_BIN override that when set by hand.
 function(mv_test)
   cmake_parse_arguments(A "" "NAME" "SOURCES;DEPS;LABELS" ${ARGN})
   add_executable(${A_NAME} ${A_SOURCES})
@@ -30,8 +32,7 @@ function(mv_test)
   set_target_properties(${A_NAME} PROPERTIES RUNTIME_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/tests)
   gtest_discover_tests(${A_NAME}
     DISCOVERY_TIMEOUT 60
-    PROPERTIES LABELS "${A_LABELS}"
-               ENVIRONMENT "QT_QPA_PLATFORM=offscreen;MV_ADDON=$<TARGET_FILE_DIR:${A_NAME}>/../lib/libmarketviews.so;MV_BIN=${CMAKE_BINARY_DIR}/bin")
+    PROPERTIES LABELS "${A_LABELS}" ENVIRONMENT "QT_QPA_PLATFORM=offscreen")
 endfunction()
 
 # Subfolders with a CMakeLists.txt, added in name order.
