@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "addon/Channel.h"
+#include "addon/Registries.h"
 #include "data/MarketStores.h"
 #include "hostconfig/UserSettings.h"
 #include "hostview/Text.h"
@@ -99,15 +100,32 @@ void CMarketDepthAdv::OnSettingsChanged() {
   m_depthGrid->Redraw();
 }
 
+void CMarketDepthAdv::ResubscribeAll() {
+  for (CSuperBaseView* view : addon::UserViews().Views()) {
+    auto* other = dynamic_cast<CMarketDepthAdv*>(view);
+    if (!other || !other->m_depthGrid || other->m_depthGrid->Instrument().InstrumentCode.empty()) continue;
+    depth::Register(other->m_depthGrid->Instrument(), other->m_levelCount, platform::TickCount());
+  }
+}
+
 void CMarketDepthAdv::OnRefreshTick() {
-  // 1. Subscriptions wanted since the last tick, by whichever depth view ticks first.
-  const addon::FeedbackSender send = [this](UINT message, LPARAM data) { SendChildFeedback(message, data); };
-  for (const depth::PendingDepth& pending : depth::TakePending()) {
-    const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
-    addon::SendInterestBatches(send, target, addon::DepthInterest(pending.levelCount));
+  const bool current = IsCurrentRegistration();
+  // A terminal may hand a subscription's values to the view that asked for it
+  // only. So the current view, the one that applies them, asks for every
+  // depth view; when it closes, its successor asks again for what is shown.
+  if (current && m_tickedBefore && !m_wasCurrent) ResubscribeAll();
+  m_wasCurrent = current;
+  m_tickedBefore = true;
+  // 1. Subscriptions wanted since the last tick.
+  if (current) {
+    const addon::FeedbackSender send = [this](UINT message, LPARAM data) { SendChildFeedback(message, data); };
+    for (const depth::PendingDepth& pending : depth::TakePending()) {
+      const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
+      addon::SendInterestBatches(send, target, addon::DepthInterest(pending.levelCount));
+    }
   }
   // 2. Marks age once, by the current view.
-  if (IsCurrentRegistration()) DepthStore::Instance().ExpireMarks(platform::TickCount());
+  if (current) DepthStore::Instance().ExpireMarks(platform::TickCount());
   // 3. Redraw when something newer than what is drawn arrived; grow the book
   //    while every asked level is filled.
   if (!m_depthGrid) return;

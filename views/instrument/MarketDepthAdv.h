@@ -4,8 +4,10 @@
 //
 // A selection asks for 5 levels; each refresh that finds every asked level
 // filled asks for 16 more (5, 21, 37, ... 99). Updates (410/412, kind 1,
-// level 1..99) are applied by the view whose registration value is current
-// only, so that an update relayed to every depth view lands once.
+// level 1..99) are applied by the depth view whose registration value is
+// current only, so that an update relayed to every depth view lands once;
+// that view also sends the subscriptions of all depth views, so that a
+// terminal that answers only the asking view still reaches it.
 #include <cstdint>
 #include <string>
 
@@ -46,10 +48,14 @@ class CMarketDepthAdv : public CSingleInstrumentView {
  private:
   void ApplyFieldUpdate(const FieldUpdate& update);
   void OnSettingsChanged();
+  // Registers the instrument of every open depth view again.
+  void ResubscribeAll();
 
   DepthGrid* m_depthGrid = nullptr;
   int m_levelCount = kFirstLevels;
   std::uint64_t m_lastStamp = 0;
   std::wstring m_emptyText;     // the host's "17005" text, asked once
   bool m_maskRestored = false;  // a saved mask waits for the restored instrument
+  bool m_wasCurrent = false;    // current at the last tick
+  bool m_tickedBefore = false;
 };

@@ -70,6 +70,13 @@ CSingleInstrumentView::CSingleInstrumentView(const addon::ViewClassInfo& info) :
 
 CSingleInstrumentView::~CSingleInstrumentView() = default;
 
+bool CSingleInstrumentView::IsCurrentRegistration() const {
+  if (!m_user.IsMember()) return false;
+  for (CSuperBaseView* view : addon::UserViews().Views())
+    if (view->GetRuntimeClass() == GetRuntimeClass()) return view == this;
+  return false;
+}
+
 // ---- Creation and controls --------------------------------------------------------
 
 int CSingleInstrumentView::OnCreate() {

@@ -79,8 +79,10 @@ class CSingleInstrumentView : public CAddonView {
   // ---- Registration ----
   // Handed out by the user registry at creation, returned at destruction.
   int RegistrationValue() const { return m_user.Id(); }
-  // Whether this view applies updates of the shared stores (its value is current).
-  bool IsCurrentRegistration() const { return m_user.IsFirst(); }
+  // Whether this view applies updates of the shared stores (its value is
+  // current): the first registered view of its own class, so that a
+  // time-and-sales view opened first does not silence the depth views.
+  bool IsCurrentRegistration() const;
 
   // ---- Contract ----
   bool EnableDragOut() override { return true; }

@@ -6,6 +6,7 @@
 
 #include "controls/InstrumentComboBox.h"
 #include "hostview/Buttons.h"
+#include "views/instrument/TimeAndSalesAdv.h"
 
 namespace depthtest {
 namespace {
@@ -167,12 +168,40 @@ TEST_F(DepthView, TwoViewsOnOneInstrument_ApplyEachUpdateOnce) {
   host.Advance(200);
   EXPECT_EQ(second->GetDepthGrid()->GetNumberRows(), 1);
 
-  // When the first view closes, the second takes over.
+  // The current view asks for what the others show, so that a terminal that
+  // answers only the asking view reaches the view that applies the values.
+  host.ClearRequests();
+  Select(second, instruments[3]);
+  host.Advance(200);
+  ASSERT_EQ(FieldRequests().size(), BatchesFor().size());
+  for (const auto& f : FieldRequests()) EXPECT_EQ(f.view, first);
+  Select(second, instruments[0]);
+
+  // When the first view closes, the second takes over and asks again for
+  // what it shows (the terminal forgets the subscriptions of a closed view).
   host.Destroy(first);
+  host.ClearRequests();
+  host.Advance(200);
+  ASSERT_EQ(FieldRequests().size(), BatchesFor().size());
+  EXPECT_EQ(FieldRequests()[0].view, second);
+  EXPECT_EQ(FieldRequests()[0].field->instrumentCode, "D05");
   Push(second, instruments[0], 2, "BUY", "9.4");
   Push(second, instruments[0], 2, "SELL", "9.7");
   host.Advance(200);
   EXPECT_EQ(second->GetDepthGrid()->GetNumberRows(), 2);
+}
+
+TEST_F(DepthView, OtherInstrumentViewsOpenedFirst_DoNotSilenceTheDepthView) {
+  host.Send(host.Adopt(new CTimeAndSalesAdv), hm::Activate);
+  CMarketDepthAdv* view = Make();
+  EXPECT_TRUE(view->IsCurrentRegistration());
+  EXPECT_GT(view->RegistrationValue(), 1);
+  Select(view, instruments[0]);
+  host.Advance(200);
+  EXPECT_EQ(FieldRequests().size(), BatchesFor().size());
+  PushLevel(view, instruments[0], 1);
+  host.Advance(200);
+  EXPECT_EQ(view->GetDepthGrid()->GetNumberRows(), 1);
 }
 
 TEST_F(DepthView, Highlight_ClearedOnTheFirstTickAtLeast1500msAfterTheChange) {
