@@ -188,6 +188,7 @@ void DepthGrid::OnGetCell(int col, int row, CGridCell& cell) {
   if (position < 0) return;
   if (row == kHeading) {
     cell.SetText(m_headings[std::size_t(position)]);
+    cell.SetCellType(&m_headingType);
     cell.SetAlignment(Qt::AlignRight | Qt::AlignVCenter);
     cell.SetTextColor(m_headText);
     cell.SetBackColor(m_headBack);

@@ -16,6 +16,19 @@ QString DumpCell(QString text) {
 
 }  // namespace
 
+void CElidedHeadingType::OnDraw(QPainter& p, const QRect& rect, int, int, const CGridCell& cell, bool, bool) {
+  DrawFace(p, rect, cell);
+  if (cell.text.isEmpty()) return;
+  p.setFont(cell.font ? *cell.font : (m_grid ? m_grid->GetHeadingFont() : QFont()));
+  const CGridCtrl::Colors def;
+  p.setPen(cell.textColor.isValid() ? cell.textColor : (m_grid ? m_grid->GetColors() : def).headText);
+  int align = cell.alignment ? cell.alignment : int(Qt::AlignCenter);
+  if (!(align & Qt::AlignVertical_Mask)) align |= Qt::AlignVCenter;
+  const QRect area = rect.adjusted(3, 0, -4, -1);
+  const QString text = p.fontMetrics().elidedText(cell.text, Qt::ElideRight, std::max(0, area.width()));
+  p.drawText(area, align | Qt::TextSingleLine, text);
+}
+
 CInstrumentGrid::CInstrumentGrid(QWidget* parent) : CGridCtrl(parent) {}
 
 CInstrumentGrid::~CInstrumentGrid() = default;

@@ -16,6 +16,16 @@
 class IStyleManager;
 class ILanguage;
 
+// Heading cells whose text is cut with "…" when the column is too narrow
+// (the heading's hint still shows it whole).
+class CElidedHeadingType : public CGridHeadingType {
+ public:
+  using CGridHeadingType::CGridHeadingType;
+  std::wstring GetName() const override { return L"ElidedHeading"; }
+  void OnDraw(QPainter& p, const QRect& rect, int col, int row, const CGridCell& cell, bool selected,
+              bool current) override;
+};
+
 class CInstrumentGrid : public CGridCtrl {
   Q_OBJECT
  public:
@@ -76,6 +86,7 @@ class CInstrumentGrid : public CGridCtrl {
   QColor m_changedBack{255, 236, 160};
   QColor m_headBack{58, 74, 99};
   QColor m_headText{255, 255, 255};
+  CElidedHeadingType m_headingType{this};
 
  private:
   std::wstring m_message;
