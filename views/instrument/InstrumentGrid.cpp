@@ -4,6 +4,7 @@
 #include <QPainter>
 
 #include "hostview/Services.h"
+#include "skin/Skin.h"
 
 namespace {
 
@@ -51,6 +52,15 @@ void CInstrumentGrid::SetStyleManager(IStyleManager* style) {
     m_headText = style->Color(kHeadText);
   }
   ApplyStyle(style);
+  if (style) {
+    // Scroll bars and frame in the grid's own colours (not the edit fields').
+    skin::SkinColors sc = skin::ColorsFromStyle(style);
+    sc.back = m_evenRow;
+    sc.text = m_cellText;
+    sc.track = QColor((sc.back.red() * 3 + sc.face.red()) / 4, (sc.back.green() * 3 + sc.face.green()) / 4,
+                      (sc.back.blue() * 3 + sc.face.blue()) / 4);
+    skin::ApplySkin(this, sc);
+  }
   Colors c = GetColors();
   c.back = m_evenRow;
   c.empty = m_evenRow;
