@@ -43,6 +43,16 @@ bool ReadLevel(const InstrumentKey& key, int level, DepthRecord& out) {
   return DepthStore::Instance().Peek(DepthKey{key.ProductID, key.InstrumentCode, level}, out);
 }
 
+bool ReadCell(const InstrumentKey& key, int level, int field, QuoteCell& out) {
+  if (level < kMinLevels || level > kMaxLevels || field < 0 || field >= int(DepthRecord::kCellCount)) return false;
+  return DepthStore::Instance().Read([&](const DepthStore::Reader& reader) {
+    const DepthRecord* r = reader.Find(DepthKey{key.ProductID, key.InstrumentCode, level});
+    if (!r) return false;
+    out = (*r)[std::size_t(field)];
+    return true;
+  });
+}
+
 BookExtent Extent(const InstrumentKey& key) {
   BookExtent extent;
   if (key.InstrumentCode.empty()) return extent;

@@ -42,6 +42,9 @@ std::size_t PendingCount();
 // Level `level` of `key` (1..99) as last stored; false when the level has no
 // record (never registered).
 bool ReadLevel(const InstrumentKey& key, int level, DepthRecord& out);
+// One cell (DepthLayout::Field) of a level, without copying the others; the
+// grid reads cells this way while painting.
+bool ReadCell(const InstrumentKey& key, int level, int field, QuoteCell& out);
 
 // Filled levels from level 1 up to the first level whose buy and sell prices
 // are both zero or without text (levels without a record end the count too),

@@ -200,9 +200,8 @@ void DepthGrid::OnGetCell(int col, int row, CGridCell& cell) {
   cell.SetTextColor(m_cellText);
   cell.SetBackColor(RowBackColor(row));
 
-  DepthRecord level;
-  if (!depth::ReadLevel(m_key, row + 1, level)) return;
-  const QuoteCell& value = level[std::size_t(Columns()[std::size_t(position)].field)];
+  QuoteCell value;
+  if (!depth::ReadCell(m_key, row + 1, Columns()[std::size_t(position)].field, value)) return;
   if (IsPriceColumn(position)) {
     // Prices as the store formats them (instrument decimals), never highlighted.
     if (value.value != 0.0) cell.SetText(value.text);

@@ -529,3 +529,22 @@ TEST_F(DepthView, Drops_AcceptedFromPriceViewAndInstrumentViews) {
 
 }  // namespace
 }  // namespace depthtest
+
+namespace depthtest {
+namespace {
+
+TEST_F(DepthFixture, ExplorerButton_AsksTheTerminalForTheInstrumentExplorer) {
+  CMarketDepthAdv* view = Make();
+  host.ClearRequests();
+  view->ExplorerButton()->click();
+  ASSERT_EQ(host.Messages(), (std::vector<UINT>{hm::OpenView}));
+  EXPECT_EQ(host.Requests()[0].wtext, L"CInsExpViewEx");
+  // The image follows the style id.
+  EXPECT_FALSE(host.style.imageReads.empty());
+  EXPECT_EQ(host.style.imageReads.back(), L".\\images\\Toolbar\\1\\InstrumentExplorer.bmp");
+  view->ChangeStyle(2);
+  EXPECT_EQ(host.style.imageReads.back(), L".\\images\\Toolbar\\2\\InstrumentExplorer.bmp");
+}
+
+}  // namespace
+}  // namespace depthtest
