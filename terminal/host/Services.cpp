@@ -186,10 +186,8 @@ COLORREF StyleManager::GetColor(int id) const {
     case 201: return p.muted;
     case 202: return p.accent;
     case 203: return p.headingText;
-    case 301: return p.up;      // alert triggered
-    case 302: return p.text;    // alert active
-    case 303: return p.muted;
-    case 304: return p.down;    // alert expired
+    case 301: return p.text;    // edit and combo box text
+    case 304: return p.oddRow;  // edit and combo box background
     case 3101: return p.up;     // rise, buy side
     case 3102: return p.down;   // fall, sell side
     case 3103: return p.changedText;
