@@ -985,3 +985,28 @@ void CGridCtrl::SetGridCursor(Qt::CursorShape shape) {
   m_cursor = shape;
   viewport()->setCursor(shape);
 }
+
+QString CGridCtrl::dumpTsv() const {
+  // GetCell asks the derived grid for the content, which is not const.
+  auto* self = const_cast<CGridCtrl*>(this);
+  const int cols = GetNumberCols();
+  QString out;
+  auto line = [&](int row) {
+    bool first = true;
+    for (int col = 0; col < cols; ++col) {
+      if (GetColWidth(col) <= 0) continue;
+      CGridCell cell;
+      self->GetCell(col, row, cell);
+      QString text = cell.text;
+      for (QChar& ch : text)
+        if (ch == QLatin1Char('\t') || ch == QLatin1Char('\r') || ch == QLatin1Char('\n')) ch = QLatin1Char(' ');
+      if (!first) out += QLatin1Char('\t');
+      out += text;
+      first = false;
+    }
+    out += QLatin1Char('\n');
+  };
+  line(kHeading);
+  for (int row = 0; row < GetNumberRows(); ++row) line(row);
+  return out;
+}

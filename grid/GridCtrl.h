@@ -146,6 +146,10 @@ class CGridCtrl : public QAbstractScrollArea {
   // Paints the visible part into `p` (sized like the viewport); used by the
   // paint event and by benchmarks and image renders.
   void PaintTo(QPainter& p, const QRect& clip);
+  // What the user sees, as tab-separated text: the heading texts, then one line
+  // per row; hidden (zero-width) columns left out; tabs and line breaks inside a
+  // cell become spaces. The terminal's --dump finds grids through this method.
+  Q_INVOKABLE QString dumpTsv() const;
 
   // ---- Editing, hints, find, clipboard ----
   // Opens the in-place editor over the cell unless OnEditStart refuses.

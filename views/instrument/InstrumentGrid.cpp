@@ -6,17 +6,6 @@
 #include "hostview/Services.h"
 #include "skin/Skin.h"
 
-namespace {
-
-// One cell of the dump: tabs and line breaks would split it.
-QString DumpCell(QString text) {
-  for (QChar& c : text)
-    if (c == QLatin1Char('\t') || c == QLatin1Char('\r') || c == QLatin1Char('\n')) c = QLatin1Char(' ');
-  return text;
-}
-
-}  // namespace
-
 void CElidedHeadingType::OnDraw(QPainter& p, const QRect& rect, int, int, const CGridCell& cell, bool, bool) {
   DrawFace(p, rect, cell);
   if (cell.text.isEmpty()) return;
@@ -77,30 +66,6 @@ void CInstrumentGrid::Reset() {
 }
 
 void CInstrumentGrid::Redraw() { viewport()->update(); }
-
-QString CInstrumentGrid::dumpTsv() const {
-  // GetCell asks the derived grid for each cell, which is not const.
-  auto* self = const_cast<CInstrumentGrid*>(this);
-  const int cols = GetNumberCols();
-  QString out;
-  auto line = [&](int row) {
-    QString text;
-    bool first = true;
-    for (int col = 0; col < cols; ++col) {
-      if (GetColWidth(col) <= 0) continue;  // hidden
-      CGridCell cell;
-      self->GetCell(col, row, cell);
-      if (!first) text += QLatin1Char('\t');
-      text += DumpCell(cell.text);
-      first = false;
-    }
-    out += text;
-    out += QLatin1Char('\n');
-  };
-  line(kHeading);
-  for (int row = 0; row < GetNumberRows(); ++row) line(row);
-  return out;
-}
 
 void CInstrumentGrid::paintEvent(QPaintEvent* e) {
   CGridCtrl::paintEvent(e);

@@ -4,7 +4,6 @@
 //   - a message shown over the empty grid (the empty-state text, or why the
 //     instrument is refused);
 //   - the row colours of the style (odd/even rows, data text, changed values);
-//   - the dump of what the user sees, for `terminal --dump` (dumpTsv);
 //   - the hooks the shared view calls: Reset, NewestStamp, ApplyLanguage.
 // UI thread only.
 #include <QString>
@@ -72,7 +71,6 @@ class CInstrumentGrid : public CGridCtrl {
 
   // The headings and every row as the user sees them, tab-separated (see the
   // grid dump convention of the terminal).
-  Q_INVOKABLE QString dumpTsv() const;
   Q_INVOKABLE QString messageText() const { return QString::fromStdWString(m_message); }
 
  protected:
