@@ -222,6 +222,7 @@ struct HostRuntime::Impl {
     FieldRequest request;
   };
   std::vector<Fetch> fetches;
+  std::set<std::pair<std::int64_t, std::string>> unknownLogged;
 
   std::vector<StoredWatchlist> userLists, brandLists;
   std::int32_t nextWatchlistId = 1001;
@@ -407,7 +408,9 @@ void HostRuntime::Impl::SubmitPending412(ViewRec& rec) {
   for (const FieldRequest& r : batch) {
     const int idx = InstrumentOf(r);
     if (idx < 0) {
-      log->Warn("field request for an unknown instrument " + std::to_string(r.productId) + "/" + r.instrumentCode);
+      // Once per instrument: a stale watchlist item would otherwise log on every batch.
+      if (unknownLogged.insert({r.productId, r.instrumentCode}).second)
+        log->Warn("field request for an unknown instrument " + std::to_string(r.productId) + "/" + r.instrumentCode);
       continue;
     }
     Subscribe(v, r, idx, answers, answered);
