@@ -33,6 +33,7 @@ const QStringList kAddonClasses = {"CPriceViewAdv",   "CMarketDepthAdv",   "CTim
                                    "CTradeSummaryAdv", "CPriceAlertList",  "CNewPriceAlertAdv"};
 constexpr int kPumpMs = 50;
 constexpr double kDefaultHeadlessSeconds = 10;
+constexpr int kAutosaveMs = 60 * 1000;
 
 StartParamMap Widen(const std::map<std::string, std::string>& in) {
   StartParamMap out;
@@ -142,6 +143,9 @@ bool TerminalApp::Start(std::string& error) {
     // Real time: move the market along with the monotonic clock.
     connect(&m_pump, &QTimer::timeout, this, [this] { m_runtime->PumpNow(); });
     m_pump.start(kPumpMs);
+    // The layout is also saved now and then, so a crash or a kill loses little of it.
+    connect(&m_autosave, &QTimer::timeout, this, [this] { SaveLayout(); });
+    m_autosave.start(kAutosaveMs);
   }
   m_window->show();
   return true;
@@ -315,7 +319,7 @@ int TerminalApp::RunTimed() {
   const auto steps = static_cast<long long>(seconds * 1000.0 / kPumpMs + 0.5);
   Progress("running " + QString::number(seconds).toStdString() + " simulated seconds with " +
            std::to_string(m_window->Docks().size()) + " views");
-  for (long long i = 0; i < steps && !m_shutDown; ++i) {
+  for (long long i = 0; i < steps && !m_shutDown && !m_stopRequested; ++i) {
     clock.Advance(kPumpMs);
     m_runtime->Pump(clock.Now());
     platform::ProcessPosted();
@@ -327,12 +331,12 @@ int TerminalApp::RunTimed() {
   if (!m_options.dumpDir.empty()) {
     const int n = DumpGrids(m_options.dumpDir, error);
     if (n < 0) { Progress("error: " + error); code = 1; }
-    else Progress("wrote " + std::to_string(n) + " grid dumps to " + m_options.dumpDir);
+    else Progress("wrote " + std::to_string(n) + (n == 1 ? " grid dump to " : " grid dumps to ") + m_options.dumpDir);
   }
   if (!m_options.snapshotDir.empty()) {
     const int n = Snapshot(m_options.snapshotDir, error);
     if (n < 0) { Progress("error: " + error); code = 1; }
-    else Progress("wrote " + std::to_string(n) + " snapshots to " + m_options.snapshotDir);
+    else Progress("wrote " + std::to_string(n) + (n == 1 ? " snapshot to " : " snapshots to ") + m_options.snapshotDir);
   }
   Shutdown();
   return code;
@@ -392,10 +396,18 @@ int TerminalApp::Snapshot(const std::string& dir, std::string& error) {
   return files;
 }
 
+void TerminalApp::RequestStop() {
+  if (m_stopRequested) return;
+  m_stopRequested = true;
+  Progress("stopping");
+  if (!m_options.seconds && !m_options.headless) QCoreApplication::quit();
+}
+
 void TerminalApp::Shutdown() {
   if (m_shutDown || !m_window || !m_runtime) return;
   m_shutDown = true;
   m_pump.stop();
+  m_autosave.stop();
   if (!m_options.seconds && !m_options.headless) SaveLayout();
   m_window->CloseAllViews();
 }

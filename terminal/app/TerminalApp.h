@@ -36,6 +36,8 @@ class TerminalApp : public QObject, public IHostShell {
   int RunTimed();
   // Saves the layout and closes every view (idempotent).
   void Shutdown();
+  // Ends a timed run early (after the current step) or the event loop (SIGINT, SIGTERM).
+  void RequestStop();
 
   MainWindow& Window() { return *m_window; }
   HostRuntime& Runtime() { return *m_runtime; }
@@ -80,7 +82,9 @@ class TerminalApp : public QObject, public IHostShell {
   std::unique_ptr<HostRuntime> m_runtime;
   std::unique_ptr<MainWindow> m_window;
   QTimer m_pump;
+  QTimer m_autosave;
   bool m_shutDown = false;
+  bool m_stopRequested = false;
   int m_styleId = 1;
 };
 

@@ -1,6 +1,10 @@
 // The terminal: loads the market views add-on and hosts its views in docks on
 // a simulated market. See --help.
 #include <QApplication>
+#include <QSocketNotifier>
+#include <csignal>
+#include <fcntl.h>
+#include <unistd.h>
 #include <cstdio>
 #include <cstdlib>
 #include <string>
@@ -40,6 +44,15 @@ int ListInstruments(const term::Options& o) {
   }
   std::fwrite(out.data(), 1, out.size(), stdout);
   return 0;
+}
+
+// SIGINT and SIGTERM end the terminal the normal way (layout saved), through
+// a pipe the event loop watches.
+int g_signalPipe[2] = {-1, -1};
+
+void OnSignal(int) {
+  const char byte = 1;
+  [[maybe_unused]] const auto n = write(g_signalPipe[1], &byte, 1);
 }
 
 void QuietQtMessages(QtMsgType type, const QMessageLogContext&, const QString& text) {
@@ -116,6 +129,22 @@ int main(int argc, char** argv) {
   int code = 0;
   {
     term::TerminalApp terminal(options, addon, store.get());
+    std::unique_ptr<QSocketNotifier> stopper;
+    if (pipe2(g_signalPipe, O_CLOEXEC | O_NONBLOCK) == 0) {
+      stopper = std::make_unique<QSocketNotifier>(g_signalPipe[0], QSocketNotifier::Read);
+      QObject::connect(stopper.get(), &QSocketNotifier::activated, [&terminal] {
+        char buf[16];
+        while (read(g_signalPipe[0], buf, sizeof buf) > 0) {
+        }
+        terminal.RequestStop();
+      });
+      struct sigaction sa {};
+      sa.sa_handler = OnSignal;
+      sigemptyset(&sa.sa_mask);
+      sa.sa_flags = SA_RESTART;
+      sigaction(SIGINT, &sa, nullptr);
+      sigaction(SIGTERM, &sa, nullptr);
+    }
     if (!terminal.Start(error)) return Fail(error);
     if (!report.message.empty()) terminal.Window().ShowNotice(QString::fromStdString(report.message));
     code = timed ? terminal.RunTimed() : app.exec();

@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <poll.h>
+#include <signal.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -236,4 +237,46 @@ TEST(TerminalHeadless, CorruptDatabaseIsSetAsideAndReported) {
   for (const auto& name : FileNames(dir.path))
     if (name.rfind("terminal.db.corrupt-", 0) == 0 && ReadFile(dir.path / name) == garbage) ++kept;
   EXPECT_EQ(kept, 1);
+}
+
+// Killed with SIGTERM in the middle of a long run: the terminal stops, saves its
+// layout and exits normally.
+TEST(TerminalHeadless, TermSignalStopsTheRunAndKeepsTheLayout) {
+  TempDir dir;
+  const std::string exe = (BinDir() / "terminal").string();
+  int err[2];
+  ASSERT_EQ(pipe(err), 0);
+  const pid_t pid = fork();
+  if (pid == 0) {
+    dup2(err[1], STDERR_FILENO);
+    close(err[0]);
+    close(err[1]);
+    execl(exe.c_str(), exe.c_str(), "--headless", "--instruments", "100", "--data-dir", dir.path.c_str(), "--seconds",
+          "1000000", "--open", "CTradeView", "--open", "CFNews", static_cast<char*>(nullptr));
+    _exit(127);
+  }
+  close(err[1]);
+  std::string text;
+  char buf[512];
+  bool signalled = false;
+  for (ssize_t n; (n = read(err[0], buf, sizeof buf)) > 0;) {
+    text.append(buf, static_cast<std::size_t>(n));
+    if (!signalled && text.find("running") != std::string::npos) {
+      kill(pid, SIGTERM);
+      signalled = true;
+    }
+  }
+  close(err[0]);
+  int status = 0;
+  ASSERT_EQ(waitpid(pid, &status, 0), pid);
+  ASSERT_TRUE(signalled) << text;
+  ASSERT_TRUE(WIFEXITED(status)) << "ended by a signal: " << text;
+  EXPECT_EQ(WEXITSTATUS(status), 0) << text;
+  EXPECT_NE(text.find("stopping"), std::string::npos) << text;
+
+  term::StoreOpenReport report;
+  std::string error;
+  auto store = term::Store::Open(dir.path, report, error);
+  ASSERT_TRUE(store) << error;
+  EXPECT_EQ(store->LoadLayout().views.size(), 2u);
 }
