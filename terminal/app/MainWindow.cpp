@@ -71,7 +71,13 @@ MainWindow::MainWindow(const QStringList& addonClasses, const QStringList& termi
           [this](QDockWidget* d) { SetActiveDock(qobject_cast<ViewDock*>(d)); });
 }
 
-MainWindow::~MainWindow() { qApp->removeEventFilter(this); }
+MainWindow::~MainWindow() {
+  // Children die after this body: no focus or dock signal may reach a half-destroyed window.
+  qApp->removeEventFilter(this);
+  disconnect(qApp, nullptr, this, nullptr);
+  disconnect(this, nullptr, this, nullptr);
+  for (ViewDock* d : Docks()) disconnect(d, nullptr, this, nullptr);
+}
 
 void MainWindow::BuildMenus(const QStringList& addonClasses, const QStringList& terminalClasses,
                             const std::vector<Style>& styles, int currentStyle) {

@@ -51,7 +51,8 @@ CREATE TABLE layout_state (
 );
 )sql";
 
-// RAII prepared statement.
+// RAII prepared statement. Connections close with sqlite3_close_v2, which
+// waits for statements still alive instead of leaking the connection.
 class Stmt {
  public:
   Stmt(sqlite3* db, const char* sql) { m_rc = sqlite3_prepare_v2(db, sql, -1, &m_stmt, nullptr); }
@@ -121,7 +122,7 @@ Probe ProbeFile(const fs::path& path, int& version, std::string& detail) {
   sqlite3* db = nullptr;
   // Read-write so that a hot WAL left by a killed terminal is recovered, as it must be.
   int rc = sqlite3_open_v2(path.c_str(), &db, SQLITE_OPEN_READWRITE, nullptr);
-  auto close = [&] { sqlite3_close(db); };
+  auto close = [&] { sqlite3_close_v2(db); };
   if (rc != SQLITE_OK) {
     detail = sqlite3_errstr(rc);
     close();
@@ -237,7 +238,7 @@ std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report,
   const int rc = sqlite3_open_v2(path.c_str(), &db, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE, nullptr);
   if (rc != SQLITE_OK) {
     error = "cannot open " + path.string() + ": " + (db ? sqlite3_errmsg(db) : sqlite3_errstr(rc));
-    sqlite3_close(db);
+    sqlite3_close_v2(db);
     return nullptr;
   }
   std::unique_ptr<Store> store(new Store(db, path));
@@ -259,7 +260,7 @@ std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report,
   return store;
 }
 
-Store::~Store() { sqlite3_close(m_db); }
+Store::~Store() { sqlite3_close_v2(m_db); }
 
 bool Store::Exec(const char* sql) {
   char* msg = nullptr;
