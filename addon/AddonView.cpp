@@ -161,12 +161,7 @@ void CAddonView::LogLine(const char* format, ...) const {
   if (!format || !addon::FindLogger(ClassNameW())) return;
   va_list args;
   va_start(args, format);
-  va_list copy;
-  va_copy(copy, args);
-  const int size = std::vsnprintf(nullptr, 0, format, copy);
-  va_end(copy);
-  std::string text(size > 0 ? static_cast<std::size_t>(size) : 0, '\0');
-  if (size > 0) std::vsnprintf(text.data(), text.size() + 1, format, args);
+  const std::string text = hv::FormatV(format, args);
   va_end(args);
   addon::LogLine(ClassNameW(), "%s", text.c_str());
 }

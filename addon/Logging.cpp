@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "hostview/Services.h"
+#include "hostview/Text.h"
 
 namespace addon {
 namespace {
@@ -45,14 +46,9 @@ void LogLine(std::wstring_view className, const char* format, ...) {
   // hand it over as one "%s" argument.
   va_list args;
   va_start(args, format);
-  va_list copy;
-  va_copy(copy, args);
-  const int size = std::vsnprintf(nullptr, 0, format, copy);
-  va_end(copy);
-  std::vector<char> buffer(size > 0 ? static_cast<std::size_t>(size) + 1 : 1, '\0');
-  if (size > 0) std::vsnprintf(buffer.data(), buffer.size(), format, args);
+  const std::string text = hv::FormatV(format, args);
   va_end(args);
-  logger->Log(kLogLevel, "%s", buffer.data());
+  logger->Log(kLogLevel, "%s", text.c_str());
 }
 
 }  // namespace addon

@@ -346,13 +346,11 @@ class ViewLogger : public ILogger {
   explicit ViewLogger(std::shared_ptr<spdlog::logger> logger) : logger_(std::move(logger)) {}
   void Log(int level, const char* format, ...) override {
     if (!format) return;
-    char buf[2048];
     va_list args;
     va_start(args, format);
-    const int n = std::vsnprintf(buf, sizeof buf, format, args);
+    const std::string text = hv::FormatV(format, args);
     va_end(args);
-    if (n < 0) return;
-    logger_->log(LevelOf(level), "{}", buf);
+    logger_->log(LevelOf(level), "{}", text);
   }
 
  private:

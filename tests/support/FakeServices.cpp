@@ -4,6 +4,8 @@
 #include <cstdarg>
 #include <cstdio>
 
+#include "hostview/Text.h"
+
 namespace mvtest {
 
 std::wstring FakeLanguage::GetText(int section, int entry) const {
@@ -33,12 +35,7 @@ void RecordingLogger::Log(int level, const char* format, ...) {
   if (!format) return;
   va_list args;
   va_start(args, format);
-  va_list copy;
-  va_copy(copy, args);
-  const int size = std::vsnprintf(nullptr, 0, format, copy);
-  va_end(copy);
-  std::string text(size > 0 ? static_cast<std::size_t>(size) : 0, '\0');
-  if (size > 0) std::vsnprintf(text.data(), text.size() + 1, format, args);
+  std::string text = hv::FormatV(format, args);
   va_end(args);
   if (sink) sink->push_back({level, text});
   lines.push_back({level, std::move(text)});

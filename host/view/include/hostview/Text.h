@@ -1,7 +1,9 @@
 #pragma once
 // The one place where narrow (UTF-8) host text and wide text meet.
 // Header-only and Qt-free so that the data layer can use it on its hot path.
+#include <cstdarg>
 #include <cstdint>
+#include <cstdio>
 #include <string>
 #include <string_view>
 
@@ -50,6 +52,20 @@ inline std::string Narrow(std::wstring_view w) {
     else { out.push_back(static_cast<char>(0xF0 | (cp >> 18))); out.push_back(static_cast<char>(0x80 | ((cp >> 12) & 0x3F))); out.push_back(static_cast<char>(0x80 | ((cp >> 6) & 0x3F))); out.push_back(static_cast<char>(0x80 | (cp & 0x3F))); }
   }
   return out;
+}
+
+// printf-style formatting of a va_list into a string of any length ("" when
+// the format is null or invalid). The caller still owns and ends `args`.
+inline std::string FormatV(const char* format, std::va_list args) {
+  if (!format) return {};
+  std::va_list copy;
+  va_copy(copy, args);
+  const int size = std::vsnprintf(nullptr, 0, format, copy);
+  va_end(copy);
+  if (size <= 0) return {};
+  std::string text(static_cast<std::size_t>(size), '\0');
+  std::vsnprintf(text.data(), text.size() + 1, format, args);
+  return text;
 }
 
 }  // namespace hv
