@@ -797,6 +797,9 @@ CSuperBaseView* HostRuntime::CreateView(const CRuntimeClass* descriptor, QWidget
   if (Impl::ViewRec* rec = d->Find(v); rec && descriptor->m_lpszClassName) rec->className = descriptor->m_lpszClassName;
   v->SetStartParam(startProductId, startCode, startParams);
   v->Create();
+  // Texts and title come from the language table; a view that only sends its
+  // title from ApplyLanguage would otherwise stay untitled until a reload.
+  v->ApplyLanguage();
   return v;
 }
 

@@ -96,3 +96,24 @@ TEST(HostServices, ViewsGetTheServicesWhenCreatedThroughTheirDescriptor) {
   h.runtime->DestroyView(v, true);
   EXPECT_TRUE(h.runtime->Views().empty());
 }
+
+// A view that sends its title only from ApplyLanguage must not stay untitled
+// until the user reloads the language.
+TEST(HostServices, ViewsLoadTheirTextsOnceWhenCreated) {
+  struct TitledView : RecordingView {
+    TitledView() : RecordingView("CNewPriceAlertAdv") {}
+    void ApplyLanguage() override {
+      ++applied;
+      static const std::wstring title = L"New Price Alert";
+      SendChildFeedback(hm::Title, ToLParam(&title));
+    }
+    int applied = 0;
+  };
+  Harness h;
+  static CRuntimeClass rc{"CNewPriceAlertAdv", int(sizeof(TitledView)), 0xFFFF,
+                          [] { return static_cast<CSuperBaseView*>(new TitledView); }, nullptr};
+  auto* v = static_cast<TitledView*>(h.runtime->CreateView(&rc, nullptr, -1, "", {}));
+  ASSERT_NE(v, nullptr);
+  EXPECT_EQ(v->applied, 1);
+  h.runtime->DestroyView(v, true);
+}
