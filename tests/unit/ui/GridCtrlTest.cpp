@@ -403,3 +403,15 @@ TEST_F(GridTest, Grid_KeysMoveTheCurrentRowAndCopy) {
 }
 
 }  // namespace
+
+// The terminal's --dump reads what a user sees: headings first, every row
+// (visible or scrolled away), hidden columns left out.
+TEST_F(GridTest, Grid_DumpShowsHeadingsAndEveryRowWithoutHiddenColumns) {
+  RecordingGrid g(3, 40);
+  g.SetColWidth(1, 0);
+  const QStringList lines = g.dumpTsv().split(QLatin1Char('\n'), Qt::SkipEmptyParts);
+  ASSERT_EQ(lines.size(), 41);
+  EXPECT_EQ(lines[0], QStringLiteral("H0\tH2"));
+  EXPECT_EQ(lines[1], QStringLiteral("r0c0\tr0c2"));
+  EXPECT_EQ(lines[40], QStringLiteral("r39c0\tr39c2"));
+}
