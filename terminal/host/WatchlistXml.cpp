@@ -75,9 +75,23 @@ bool TextAttr(const QXmlStreamAttributes& a, const char* name, std::string& out,
   return true;
 }
 
-template <class T>
-void BySeq(std::vector<T>& v) {
-  std::stable_sort(v.begin(), v.end(), [](const T& a, const T& b) { return a.seq < b.seq; });
+// Reads one entry per <child> element; on success `out` gets the entries in
+// SeqID order, on failure it is left untouched.
+template <class T, class Read>
+bool ReadEntries(const std::wstring& text, const char* root, std::vector<T>& out, std::string& error, Read read) {
+  std::vector<T> v;
+  const bool ok = Walk(text, root, "watchlistname", error, [&](const QXmlStreamAttributes& a, std::string& err) {
+    T e;
+    std::int64_t seq = 0;
+    if (!read(a, e, err) || !Int64Attr(a, "SeqID", seq, err, false)) return false;
+    e.seq = std::int32_t(seq);
+    v.push_back(std::move(e));
+    return true;
+  });
+  if (!ok) return false;
+  std::stable_sort(v.begin(), v.end(), [](const T& x, const T& y) { return x.seq < y.seq; });
+  out = std::move(v);
+  return true;
 }
 
 std::wstring Escape(const std::wstring& s) {
@@ -98,59 +112,26 @@ std::wstring Escape(const std::wstring& s) {
 }  // namespace
 
 bool ParseWatchlistNames(const std::wstring& text, std::vector<NameEntry>& out, std::string& error) {
-  std::vector<NameEntry> v;
-  const bool ok = Walk(text, "watchlistmain", "watchlistname", error, [&](const QXmlStreamAttributes& a, std::string& err) {
-    NameEntry e;
-    std::int64_t id = 0, seq = 0;
-    if (!Int64Attr(a, "WatchlistID", id, err) || !TextAttr(a, "WatchlistName", e.name, err) ||
-        !Int64Attr(a, "SeqID", seq, err, false))
-      return false;
+  return ReadEntries(text, "watchlistmain", out, error, [](const QXmlStreamAttributes& a, NameEntry& e, std::string& err) {
+    std::int64_t id = 0;
+    if (!Int64Attr(a, "WatchlistID", id, err) || !TextAttr(a, "WatchlistName", e.name, err)) return false;
     e.id = std::int32_t(id);
-    e.seq = std::int32_t(seq);
-    v.push_back(std::move(e));
     return true;
   });
-  if (!ok) return false;
-  BySeq(v);
-  out = std::move(v);
-  return true;
 }
 
 bool ParseUserItems(const std::wstring& text, std::vector<ItemEntry>& out, std::string& error) {
-  std::vector<ItemEntry> v;
-  const bool ok = Walk(text, "watchlistnames", "watchlistname", error, [&](const QXmlStreamAttributes& a, std::string& err) {
-    ItemEntry e;
-    std::int64_t seq = 0;
-    if (!Int64Attr(a, "ProductID", e.productId, err) || !TextAttr(a, "InstrumentCode", e.instrumentCode, err) ||
-        !Int64Attr(a, "SeqID", seq, err, false))
-      return false;
-    e.seq = std::int32_t(seq);
-    v.push_back(std::move(e));
-    return true;
+  return ReadEntries(text, "watchlistnames", out, error, [](const QXmlStreamAttributes& a, ItemEntry& e, std::string& err) {
+    return Int64Attr(a, "ProductID", e.productId, err) && TextAttr(a, "InstrumentCode", e.instrumentCode, err);
   });
-  if (!ok) return false;
-  BySeq(v);
-  out = std::move(v);
-  return true;
 }
 
 bool ParseBrandItems(const std::wstring& text, std::vector<ItemEntry>& out, std::string& error) {
-  std::vector<ItemEntry> v;
-  const bool ok = Walk(text, "watchlistnames", "watchlistname", error, [&](const QXmlStreamAttributes& a, std::string& err) {
-    ItemEntry e;
-    std::int64_t seq = 0;
-    if (!TextAttr(a, "InstrumentCode", e.instrumentCode, err) || !TextAttr(a, "Exchange", e.exchange, err) ||
-        !Int64Attr(a, "ProductID", e.productId, err) || !TextAttr(a, "Symbol", e.symbol, err, false) ||
-        !TextAttr(a, "Market", e.market, err, false) || !Int64Attr(a, "SeqID", seq, err, false))
-      return false;
-    e.seq = std::int32_t(seq);
-    v.push_back(std::move(e));
-    return true;
+  return ReadEntries(text, "watchlistnames", out, error, [](const QXmlStreamAttributes& a, ItemEntry& e, std::string& err) {
+    return TextAttr(a, "InstrumentCode", e.instrumentCode, err) && TextAttr(a, "Exchange", e.exchange, err) &&
+           Int64Attr(a, "ProductID", e.productId, err) && TextAttr(a, "Symbol", e.symbol, err, false) &&
+           TextAttr(a, "Market", e.market, err, false);
   });
-  if (!ok) return false;
-  BySeq(v);
-  out = std::move(v);
-  return true;
 }
 
 std::wstring WriteWatchlistNames(const std::vector<NameEntry>& entries) {
