@@ -166,6 +166,13 @@ class CellStore {
     return taken;
   }
   std::size_t PendingCount() const;
+  // Puts `key` on the pending list again (a view re-asks an instrument that
+  // never answered); false when it is pending already.
+  bool QueuePending(const Key& key);
+
+  // Forgets every record and the pending list (tests; a store's version keeps
+  // growing, so a view never mistakes a new record for one it has seen).
+  void Clear();
 
   // Clears marks that are kMarkLifetimeMs old or older.
   void ExpireMarks(std::uint32_t now);
@@ -366,6 +373,15 @@ std::vector<typename CellStore<L>::Key> CellStore<L>::TakePending(int limit) {
 }
 
 template <class L>
+bool CellStore<L>::QueuePending(const Key& key) {
+  std::lock_guard lock(mu_);
+  for (const Key& k : pending_)
+    if (k == key) return false;
+  pending_.push_back(key);
+  return true;
+}
+
+template <class L>
 std::size_t CellStore<L>::PendingCount() const {
   std::lock_guard lock(mu_);
   return pending_.size();
@@ -400,6 +416,17 @@ void CellStore<L>::ExpireMarks(std::uint32_t now) {
       marked_.pop_back();
     }
   }
+}
+
+template <class L>
+void CellStore<L>::Clear() {
+  std::lock_guard lock(mu_);
+  map_.clear();
+  records_.clear();
+  pending_.clear();
+  marked_.clear();
+  changed_.clear();
+  BumpVersion();
 }
 
 template <class L>
