@@ -155,8 +155,9 @@ void PriceGrid::SetRows(std::vector<InstrumentKey> keys) {
 PriceGrid::Row PriceGrid::JoinRow(const InstrumentKey& key) const {
   Row row;
   row.key = key;
-  const JInstrumentUnderlying* ins = InstrumentMgr_ReadOnly().FindPtr(key);
-  if (!ins) ins = InstrumentMgr().FindPtr(key);
+  // The price view's own records (names the terminal changed) win over the list.
+  const JInstrumentUnderlying* ins = InstrumentMgr().FindPtr(key);
+  if (!ins) ins = InstrumentMgr_ReadOnly().FindPtr(key);
   if (!ins) {
     row.symbol = Q(key.InstrumentCode);
     return row;

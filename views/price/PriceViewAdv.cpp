@@ -381,6 +381,7 @@ void CPriceViewAdv::OnActivate() {
   SendViewSize(300, 150);
   m_activeViews.Join(this);
   StartTimers();
+  QueryDisplayMode();
   LayoutFamilyButtons();
   if (m_firstActivation) {
     m_firstActivation = false;
@@ -392,7 +393,7 @@ void CPriceViewAdv::OnActivate() {
   } else {
     // Lists that changed while another view had the focus.
     for (int family = 0; family < 3; ++family)
-      if (m_tabsStale[family]) OnWatchlistsChanged(family);
+      if (m_tabsStale[family]) ReloadFamily(family);
   }
   ApplyLanguage();
   SetActiveFlag(true);
@@ -410,7 +411,7 @@ void CPriceViewAdv::OnDeactivate() {
 // ---- Layout ---------------------------------------------------------------------------------------
 
 void CPriceViewAdv::LayoutFamilyButtons() {
-  const bool compactMode = QueryDisplayMode() == 101;
+  const bool compactMode = DisplayModeValue() == 101;
   CBranticButton* user = m_familyButtons[kUserWatchlists];
   if (!user) return;
   if (compactMode) {
@@ -645,6 +646,10 @@ void CPriceViewAdv::OnWatchlistsChanged(int family) {
     m_tabsStale[family] = true;
     return;
   }
+  ReloadFamily(family);
+}
+
+void CPriceViewAdv::ReloadFamily(int family) {
   m_tabsStale[family] = false;
   LoadTabs(family);
   LayoutFamilyButtons();

@@ -181,6 +181,8 @@ class CPriceViewAdv : public CAddonView {
   void OnUserWatchlists(const std::vector<JWatchlistRow>& rows);
   void OnTop30(const std::vector<JTop30Group>& groups);
   void OnWatchlistsChanged(int family);
+  // Tabs of the family again, and its list when it is on screen.
+  void ReloadFamily(int family);
 
   // Timers.
   void OnRefreshTick();

@@ -194,7 +194,7 @@ struct PriceFixture : ::testing::Test {
   }
 
   // The column of a key in the grid; fails the test when not shown.
-  static int Col(PriceGrid* grid, pricecol::Col c) {
+  static int ColOf(PriceGrid* grid, pricecol::Col c) {
     const int col = grid->ColumnOf(c);
     EXPECT_GE(col, 0);
     return col;
