@@ -166,10 +166,6 @@ class CellStore {
     return taken;
   }
   std::size_t PendingCount() const;
-  // Puts `key` on the pending list again (a view re-asks an instrument that
-  // never answered); false when it is pending already.
-  bool QueuePending(const Key& key);
-
   // Forgets every record and the pending list (tests; a store's version keeps
   // growing, so a view never mistakes a new record for one it has seen).
   void Clear();
@@ -370,15 +366,6 @@ std::vector<typename CellStore<L>::Key> CellStore<L>::TakePending(int limit) {
   std::vector<Key> taken(std::make_move_iterator(pending_.begin()), std::make_move_iterator(pending_.begin() + limit));
   pending_.erase(pending_.begin(), pending_.begin() + limit);
   return taken;
-}
-
-template <class L>
-bool CellStore<L>::QueuePending(const Key& key) {
-  std::lock_guard lock(mu_);
-  for (const Key& k : pending_)
-    if (k == key) return false;
-  pending_.push_back(key);
-  return true;
 }
 
 template <class L>

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <numeric>
 
+#include "addon/Feeds.h"
 #include "addon/LinkText.h"
 #include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
@@ -141,12 +142,7 @@ void PriceGrid::SetRows(std::vector<InstrumentKey> keys) {
   for (auto& key : keys) m_rows.push_back(JoinRow(key));
   m_quotes.assign(m_rows.size(), QuoteRecord{});
   m_quoteVersion.assign(m_rows.size(), 0);
-  const std::uint32_t now = platform::TickCount();
-  // Asking the store for a record queues an unknown instrument for a quote request.
-  for (std::size_t i = 0; i < m_rows.size(); ++i) {
-    m_quotes[i] = QuoteStore::Instance().Get(m_rows[i].key, now);
-    m_quoteVersion[i] = m_quotes[i].version;
-  }
+  for (std::size_t i = 0; i < m_rows.size(); ++i) ReadRowQuote(i);
   m_seenStoreVersion = ~0ull;
   SetNumberRows(int(m_rows.size()));
   AskMarketDelays();
@@ -182,12 +178,22 @@ void PriceGrid::RejoinInstruments() {
 bool PriceGrid::AddRow(const InstrumentKey& key) {
   if (FindRow(key) >= 0) return false;
   m_rows.push_back(JoinRow(key));
-  m_quotes.push_back(QuoteStore::Instance().Get(key, platform::TickCount()));
-  m_quoteVersion.push_back(m_quotes.back().version);
+  m_quotes.emplace_back();
+  m_quoteVersion.push_back(0);
+  ReadRowQuote(m_rows.size() - 1);
   SetNumberRows(int(m_rows.size()));
   AskMarketDelays();
   RedrawAll();
   return true;
+}
+
+void PriceGrid::ReadRowQuote(std::size_t i) {
+  // A shown instrument is registered with the quote feed: its record exists
+  // (so that values land) and it is asked for on the view's next second.
+  addon::QuoteFeed& feed = addon::QuoteFeed::Instance();
+  feed.Register(m_rows[i].key, {}, platform::TickCount());
+  feed.Read(m_rows[i].key, m_quotes[i]);
+  m_quoteVersion[i] = m_quotes[i].version;
 }
 
 std::vector<InstrumentKey> PriceGrid::Rows() const {

@@ -13,6 +13,8 @@
 #include <unordered_set>
 
 #include "addon/Channel.h"
+#include "addon/Feeds.h"
+#include "addon/Logging.h"
 #include "addon/LinkText.h"
 #include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
@@ -47,10 +49,6 @@ constexpr const wchar_t* kBoardImage = L".\\images\\QuickBar\\[styleID]\\tradebo
 constexpr const wchar_t* kExplorerImage = L".\\images\\Toolbar\\[styleID]\\InstrumentExplorer.bmp";
 constexpr const wchar_t* kHelpImage = L".\\images\\Bitmaps\\[styleID]\\help.bmp";
 
-// Drop sources whose instruments the watchlists do not take.
-constexpr const char* kRefusedDropSources[] = {"COrderStatusViewNew", "COpenPositionView", "CMarketDepthAdv",
-                                                "CTimeAndSalesAdv", "CTradeSummaryAdv", "price view"};
-
 // Texts the view reads from the language table (section 13).
 constexpr int kLanguageIds[] = {7, 8, 10, 12, 22, 401, 402, 403, 404, 407, 408, 409, 410, 411,
                                 413, 414, 415, 416, 417, 418, 419};
@@ -71,27 +69,6 @@ std::wstring FormatText(std::wstring format, const std::wstring& value) {
 std::wstring Lang(int id, const wchar_t* fallback) {
   std::wstring text = addon::LanguageTextTable::Instance().Get(id);
   return text.empty() ? std::wstring(fallback) : text;
-}
-
-enum class ShortcutSide { None, Buy, Sell };
-
-// The six order keys: keypad plus, F5 and plus/equals buy; keypad minus, F9
-// and minus sell. `mainKey`: a main-keyboard key that also types text.
-ShortcutSide ShortcutOf(int key, Qt::KeyboardModifiers modifiers, bool* mainKey) {
-  const bool keypad = modifiers & Qt::KeypadModifier;
-  *mainKey = false;
-  switch (key) {
-    case Qt::Key_F5: return ShortcutSide::Buy;
-    case Qt::Key_F9: return ShortcutSide::Sell;
-    case Qt::Key_Plus:
-    case Qt::Key_Equal:
-      *mainKey = !keypad;
-      return ShortcutSide::Buy;
-    case Qt::Key_Minus:
-      *mainKey = !keypad;
-      return ShortcutSide::Sell;
-    default: return ShortcutSide::None;
-  }
 }
 
 // A field update of the leading price view's instrument records.
@@ -122,18 +99,22 @@ bool SameLists(const std::vector<WatchListDetail>& a, const std::vector<WatchLis
 
 const addon::ViewClassInfo& CPriceViewAdv::Info() {
   static const addon::ViewClassInfo info{
-      "CPriceViewAdv",
-      ".\\PriceViewAdv.cpp",
-      0,  // the language table has no title entry for this view
-      L"Price View",
-      {{hm::SystemParameter, "ADVFT"},
-       {hm::SystemParameter, "MAXWL"},
-       {hm::SystemParameter, "MAXWT"},
-       {hm::NoticeParameter, "OLDWL"},
-       {hm::NoticeParameter, "WLNOT"},
-       {hm::SystemParameter, "MKTEX"}},
-      {addon::RefStore::Products, addon::RefStore::Exchanges, addon::RefStore::Instruments,
-       addon::RefStore::UserWatchlists, addon::RefStore::KeldoWatchlists, addon::RefStore::Top30Watchlists},
+      .className = "CPriceViewAdv",
+      .titleEntry = 0,  // the language table has no title entry for this view
+      .defaultTitle = L"Price View",
+      .firstSettings = {{hm::SystemParameter, "ADVFT"},
+                        {hm::SystemParameter, "MAXWL"},
+                        {hm::SystemParameter, "MAXWT"},
+                        {hm::NoticeParameter, "OLDWL"},
+                        {hm::NoticeParameter, "WLNOT"},
+                        {hm::SystemParameter, "MKTEX"}},
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Exchanges, addon::RefStore::Instruments,
+                      addon::RefStore::UserWatchlists, addon::RefStore::KeldoWatchlists,
+                      addon::RefStore::Top30Watchlists},
+      // Refused on the user and KELDO pages; its own rows travel as "price view".
+      .dropSources = {"COrderStatusViewNew", "COpenPositionView", "CMarketDepthAdv", "CTimeAndSalesAdv",
+                      "CTradeSummaryAdv", addon::kPriceViewSource},
+      .descriptor = &classCPriceViewAdv,
   };
   return info;
 }
@@ -289,13 +270,17 @@ void CPriceViewAdv::BuildControls() {
     tip->hide();
   }
 
-  for (QWidget* w : {static_cast<QWidget*>(m_priceGrid), m_priceGrid->viewport(), static_cast<QWidget*>(m_combo)})
+  // The six trade keys, wherever the focus is; in the search box the
+  // main-keyboard plus, equals and minus stay text.
+  WatchTradeKeys(this);
+  WatchTradeKeys(m_priceGrid);
+  WatchTradeKeys(m_priceGrid->viewport());
+  WatchTradeKeys(m_combo, true);
+  if (m_combo->lineEdit()) WatchTradeKeys(m_combo->lineEdit(), true);
+  // The wheel gives the focus to the grid first.
+  for (QWidget* w : {static_cast<QWidget*>(m_combo), static_cast<QWidget*>(m_userTabs),
+                     static_cast<QWidget*>(m_top30Tabs), static_cast<QWidget*>(m_keldoTabs)})
     w->installEventFilter(this);
-  if (m_combo->lineEdit()) m_combo->lineEdit()->installEventFilter(this);
-  for (QWidget* w : {static_cast<QWidget*>(m_userTabs), static_cast<QWidget*>(m_top30Tabs),
-                     static_cast<QWidget*>(m_keldoTabs)})
-    w->installEventFilter(this);
-
   ReloadImages();
   ReloadComboList();
   Relayout();
@@ -517,16 +502,10 @@ std::uint32_t CPriceViewAdv::OnViewMessage(UINT message, LPARAM data) {
     case hm::InstrumentList:
       if (data) OnInstrumentList(*FromLParam<const JInstrumentListMsg>(data));
       return 0;
-    case hm::ExchangeList:
-      if (const auto* msg = FromLParam<const JExchangeListMsg>(data); msg && msg->exchanges)
-        ExchangeMgr().Fill(*msg->exchanges);
-      return 0;
     case hm::ProductList:
-      if (const auto* msg = FromLParam<const JProductListMsg>(data); msg && msg->products) {
-        ProductMgr().Fill(*msg->products);
-        m_comboList = nullptr;  // the box keeps a copy of the product map
-        ReloadComboList();
-      }
+      // Filed by the base; the box keeps a copy of the product map.
+      m_comboList = nullptr;
+      ReloadComboList();
       return 0;
     case hm::WatchlistList:
       if (data && IsLeadingPriceView()) OnUserWatchlists(*FromLParam<const std::vector<JWatchlistRow>>(data));
@@ -566,11 +545,6 @@ std::uint32_t CPriceViewAdv::OnViewMessage(UINT message, LPARAM data) {
         }
         if (m_remTip && m_remTip->Board()) m_remTip->Board()->SetPairs(m_remarkRows);
       }
-      return 0;
-    case hm::MarketInfo:
-      if (const auto* list = FromLParam<const std::vector<JMarketInfo>>(data); list && !list->empty())
-        MarketDelayCache::Instance().SetDelay(list->front().productId, hv::Widen(list->front().exchangeCode),
-                                              list->front().delay);
       return 0;
     case hm::LinkData:
       if (const auto* link = FromLParam<const ViewLink>(data); link && link->link) ApplyStartParams(*link->link);
@@ -617,7 +591,7 @@ void CPriceViewAdv::OnInstrumentFieldUpdate(const FieldUpdate& update) {
 }
 
 void CPriceViewAdv::OnInstrumentList(const JInstrumentListMsg& msg) {
-  InstrumentMgr_ReadOnly().Fill(msg.instruments);
+  // The base filed the list in the read-only instrument store.
   m_instrumentList = msg.instruments;
   if (msg.instruments) watchlist::BuildWorldIndexList(*msg.instruments);
   ReloadComboList();
@@ -682,7 +656,7 @@ void CPriceViewAdv::LoadTabs(int listKind) {
   CCustomTabCtrl* tabs = Tabs(listKind);
   WatchlistStoreT* store = StoreOfKind(listKind);
   if (!tabs || !store) return;
-  LogInfo(kLoaders[listKind], Info().sourceFile, __LINE__);
+  LogInfo(kLoaders[listKind], addon::SourceFileName(__FILE__), __LINE__);
   tabs->DeleteAllItems();
   for (const WatchListDetail& w : store->Records()) tabs->AddItem(w.name, w.WatchlistID);
   std::wstring& current = listKind == kUserWatchlists    ? m_currentUser
@@ -696,7 +670,7 @@ void CPriceViewAdv::LoadTabs(int listKind) {
   } else if (!current.empty()) {
     tabs->SetCurSel(store->IndexOf(current));
   }
-  LogInfo(kLoaders[listKind], Info().sourceFile, __LINE__);
+  LogInfo(kLoaders[listKind], addon::SourceFileName(__FILE__), __LINE__);
 }
 
 void CPriceViewAdv::OnTabNotify(int listKind, CTCNotify& n) {
@@ -755,11 +729,9 @@ void CPriceViewAdv::OnCommand(int id) {
     case kFilterButtonId: SwitchFamily(kAdvanceFilter); return;
     case kListModeButtonId: SetDisplayMode(kListMode); return;
     case kBoardModeButtonId: SetDisplayMode(kBoardMode); return;
-    case kExplorerButtonId: {
-      const std::wstring className = L"CInsExpViewEx";
-      SendChildFeedback(hm::OpenView, ToLParam(&className));
+    case kExplorerButtonId:
+      Actions().OpenInstrumentExplorer();
       return;
-    }
     case kCmdRenameUser:
       if (m_clickedTab >= 0) m_userTabs->EditLabel(m_clickedTab);
       return;
@@ -1023,8 +995,7 @@ std::wstring CPriceViewAdv::CheckAddable(const JInstrumentUnderlying& instrument
   if (m_listKind == kUserWatchlists) {
     if (rows >= limit) return Format(kTooManyItems, limit);
     const JInstrumentUnderlying copy = instrument;  // the host may replace its list while we ask
-    const int status = QueryAltStatus() ? copy.altAccessStatus : copy.accessStatus;
-    if (status == 0 || status == 2) return kNotViewable;
+    if (!addon::IsViewableStatus(Actions().AccessStatusOf(copy))) return addon::kNotViewableText;
     return {};
   }
   if (m_listKind == kKeldoWatchlists) {
@@ -1110,10 +1081,7 @@ bool CPriceViewAdv::EnableDropIn() { return m_listKind == kUserWatchlists || m_l
 
 bool CPriceViewAdv::EnableDropIn(const char* sourceClassName) {
   if (!EnableDropIn()) return false;
-  const std::string source = sourceClassName ? sourceClassName : "";
-  for (const char* refused : kRefusedDropSources)
-    if (source == refused) return false;
-  return true;
+  return !addon::IsDropSource(ClassInfo(), sourceClassName ? sourceClassName : "");
 }
 
 LRESULT CPriceViewAdv::DoDragDrop(UINT message, LPARAM data) {
@@ -1162,28 +1130,6 @@ LRESULT CPriceViewAdv::DoDragDrop(UINT message, LPARAM data) {
 
 // ---- Window messages ------------------------------------------------------------------------------------------
 
-void CPriceViewAdv::OpenView(const wchar_t* className, const std::wstring* linkText) {
-  ViewLink link;
-  link.className = className;
-  link.flag = 1;
-  link.link = linkText;
-  SendChildFeedback(hm::OpenView, ToLParam(&link));
-  SendChildFeedback(hm::LinkData, ToLParam(&link));
-}
-
-LRESULT CPriceViewAdv::OpenTradeTicket(const std::wstring* linkText, LPARAM origin) {
-  if (origin == -1) {
-    ShowMessageText("17007");
-    return 0;
-  }
-  if (origin == kShortcutOrigin) {
-    const std::wstring context = L"OPEN_TRADE_SHORTCUT";
-    SendChildFeedback(hm::ShortcutContext, ToLParam(&context));
-  }
-  OpenView(L"CTradeView", linkText);
-  return 0;
-}
-
 LRESULT CPriceViewAdv::OnWindowMessage(UINT message, WPARAM wParam, LPARAM lParam) {
   const auto& msg = addon::Msg();
   const auto* text = FromLParam<const std::wstring>(LPARAM(wParam));
@@ -1197,18 +1143,16 @@ LRESULT CPriceViewAdv::OnWindowMessage(UINT message, WPARAM wParam, LPARAM lPara
     return 0;
   }
   if (message == msg.wlOpenTrade) return OpenTradeTicket(text, lParam);
-  if (message == msg.wlOpenDepth) return OpenView(L"CMarketDepthAdv", text), 0;
-  if (message == msg.wlOpenSales) return OpenView(L"CTimeAndSalesAdv", text), 0;
-  if (message == msg.wlOpenSummary) return OpenView(L"CTradeSummaryAdv", text), 0;
-  if (message == msg.wlOpenPriceAlert) return OpenView(L"CNewPriceAlertAdv", text), 0;
-  if (message == msg.wlOpenChart) return OpenView(L"CBranticChartView", text), 0;
-  if (message == msg.wlOpenStockAnalytics) return OpenView(L"CStockAnalytics", text), 0;
-  if (message == msg.relatedNews) return OpenView(L"CFNews", text), 0;
+  if (const auto className = addon::OpenedClassOf(message)) {
+    Actions().OpenViewOn(*className, text);
+    return 0;
+  }
+  if (message == msg.wlOpenPriceAlert) {
+    Actions().OpenViewOn(L"CNewPriceAlertAdv", text);
+    return 0;
+  }
   if (message == msg.refreshTradeLink) {
-    ViewLink link;
-    link.className = L"CTradeView";
-    link.link = text;
-    SendChildFeedback(hm::LinkedInstrument, ToLParam(&link));
+    Actions().RefreshTradeLink(text);
     return 0;
   }
   if (message == msg.wlAddInsList) return AddInstrumentsByMessage(keys, int(lParam)), 0;
@@ -1233,31 +1177,19 @@ LRESULT CPriceViewAdv::OnWindowMessage(UINT message, WPARAM wParam, LPARAM lPara
 
 // ---- Keys and the mouse wheel -----------------------------------------------------------------------------------
 
-bool CPriceViewAdv::HandleShortcutKey(int key, Qt::KeyboardModifiers modifiers, bool inTextEntry) {
-  bool mainKey = false;
-  const ShortcutSide side = ShortcutOf(key, modifiers, &mainKey);
-  if (side == ShortcutSide::None) return false;
-  if (inTextEntry && mainKey) return false;
-  if (!GetUserSettings().GetKeyboardShortcutsSetting().GetEnableKeyboardShortcuts()) return true;
+std::optional<std::wstring> CPriceViewAdv::ShortcutTicket(addon::TradeSide side) {
   IQuoteGrid* grid = VisibleGrid();
   const std::vector<InstrumentKey> selected = grid ? grid->SelectedKeys() : std::vector<InstrumentKey>{};
-  if (selected.empty()) return true;
+  if (selected.empty()) return std::nullopt;
   const InstrumentKey& k = selected.front();
-  const bool buy = side == ShortcutSide::Buy;
+  addon::LinkTextBuilder text = addon::ShortcutTicketText(hv::Narrow(k.InstrumentCode), k.ProductID, side);
+  // The row's price goes with the ticket only when it is above 0.
   QuoteRecord quote;
-  std::wstring price;
   if (QuoteStore::Instance().Peek(k, quote)) {
-    const QuoteCell& cell = quote[buy ? QuoteLayout::Ask : QuoteLayout::Bid];
-    if (cell.filled && cell.value > 0) price = cell.text;
+    const QuoteCell& cell = quote[side == addon::TradeSide::Buy ? QuoteLayout::Ask : QuoteLayout::Bid];
+    if (cell.filled && cell.value > 0) text.Add(addon::linkkey::kTradePrice, cell.text);
   }
-  addon::LinkTextBuilder link("price view");
-  link.Add(addon::linkkey::kInstrumentCode, k.InstrumentCode)
-      .AddInt64(addon::linkkey::kProductId, k.ProductID)
-      .Add(addon::linkkey::kSide, buy ? "buy" : "sell");
-  if (!price.empty()) link.Add(addon::linkkey::kTradePrice, price);
-  const std::wstring text = link.Wide();
-  OpenTradeTicket(&text, kShortcutOrigin);
-  return true;
+  return text.Wide();
 }
 
 bool CPriceViewAdv::eventFilter(QObject* watched, QEvent* event) {
@@ -1265,30 +1197,7 @@ bool CPriceViewAdv::eventFilter(QObject* watched, QEvent* event) {
     // The wheel scrolls the grid whatever has the focus.
     if (IQuoteGrid* grid = VisibleGrid(); grid && !grid->Widget()->hasFocus()) grid->Widget()->setFocus();
   }
-  if (event->type() == QEvent::KeyPress || event->type() == QEvent::ShortcutOverride) {
-    auto* key = static_cast<QKeyEvent*>(event);
-    const bool inText = m_combo && (watched == m_combo->lineEdit() || watched == m_combo);
-    bool mainKey = false;
-    const ShortcutSide side = ShortcutOf(key->key(), key->modifiers(), &mainKey);
-    if (side != ShortcutSide::None && inText && mainKey) {
-      if (event->type() == QEvent::KeyPress) m_textKeyEvent = event;
-    } else if (side != ShortcutSide::None) {
-      if (event->type() == QEvent::KeyPress) HandleShortcutKey(key->key(), key->modifiers(), inText);
-      event->accept();
-      return true;
-    }
-  }
   return CAddonView::eventFilter(watched, event);
-}
-
-void CPriceViewAdv::keyPressEvent(QKeyEvent* e) {
-  const bool fromText = e == m_textKeyEvent;
-  m_textKeyEvent = nullptr;
-  if (HandleShortcutKey(e->key(), e->modifiers(), fromText)) {
-    e->accept();
-    return;
-  }
-  CAddonView::keyPressEvent(e);
 }
 
 // ---- Font size ------------------------------------------------------------------------------------------------------
@@ -1340,7 +1249,7 @@ void CPriceViewAdv::ShowLegend(bool remark) {
 void CPriceViewAdv::OnRefreshTick() {
   // One view ages the marks: the first active one, or the quote applier when
   // no price view is active.
-  if (IsFirstActiveView() || IsQuoteApplier()) QuoteStore::Instance().ExpireMarks(platform::TickCount());
+  if (IsFirstActiveView() || IsQuoteApplier()) addon::QuoteFeed::Instance().ExpireMarks(platform::TickCount());
   for (int mode = 0; mode < 2; ++mode) {
     IQuoteGrid* g = m_grids[mode];
     if (!g) continue;
@@ -1372,13 +1281,13 @@ void CPriceViewAdv::SubscribePending() {
     if (!grid) continue;
     for (InstrumentKey& k : grid->Rows()) shown.insert(std::move(k));
   }
-  QuoteStore& store = QuoteStore::Instance();
+  addon::QuoteFeed& feed = addon::QuoteFeed::Instance();
   // A view that takes over the quotes asks again for everything shown: the
   // terminal may push values only to the view that asked for them.
   if (becameApplier && addon::OpenPriceViews().Count() > 1)
-    for (const InstrumentKey& k : shown) store.QueuePending(k);
-  for (const InstrumentKey& k : store.TakePending(shown))
-    addon::SendInterestBatches(Sender(), addon::FieldTarget{k.ProductID, hv::Narrow(k.InstrumentCode)},
+    for (const InstrumentKey& k : shown) feed.Register(k, {}, platform::TickCount());
+  for (const auto& pending : feed.TakePending(shown))
+    addon::SendInterestBatches(Sender(), addon::FieldTarget{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)},
                                addon::QuoteInterest());
 }
 
@@ -1401,7 +1310,8 @@ void CPriceViewAdv::RetrySilentInstruments() {
     } else {
       continue;
     }
-    store.QueuePending(k);
+    // Registering a shown instrument again asks for it again.
+    addon::QuoteFeed::Instance().Register(k, {}, platform::TickCount());
   }
 }
 

@@ -16,11 +16,15 @@
 // subscriptions of every open price view, so that a terminal that pushes a
 // value only to the view that asked for it reaches the view that writes it.
 //
+// Trade tickets, "open view X on instrument Y", the trade keys and the access
+// rules are the shared ones of the base (CAddonView::Actions(), WatchTradeKeys).
+//
 // UI thread only. Synchronous answers (515/518, 2310, 2814, 519, 601)
 // re-enter OnHostMessage while a request is inside SendChildFeedback.
 #include <QPointer>
 #include <cstdint>
 #include <map>
+#include <optional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -66,8 +70,6 @@ class CPriceViewAdv : public CAddonView {
   static constexpr UINT kTipDelayMs = 500;
   // Silent instruments are asked again every 10th second, at most this often.
   static constexpr int kMaxRetries = 5;
-  // Trade tickets opened from a keyboard shortcut carry this origin.
-  static constexpr LPARAM kShortcutOrigin = 99;
   // Display modes.
   static constexpr int kListMode = 0;
   static constexpr int kBoardMode = 1;
@@ -75,7 +77,6 @@ class CPriceViewAdv : public CAddonView {
   // The system's own texts.
   static constexpr const wchar_t* kTooManyWatchlists = L"Number of watchlist is limited to %d";
   static constexpr const wchar_t* kTooManyItems = L"Number of priceview items is limited to %d";
-  static constexpr const wchar_t* kNotViewable = L"Counter is not Viewable.";
   static constexpr const wchar_t* kAlreadyInList = L"Instrument already exist in the list.";
   static constexpr const wchar_t* kRemoved = L"Instrument successfully removed from the list.";
   static constexpr const wchar_t* kHelpTip = L"Price delayed 15-30mins for counters with *.";
@@ -138,8 +139,6 @@ class CPriceViewAdv : public CAddonView {
   void ReorderUserWatchlists();
   // The instrument box chose `chosen`: the checks, then the row.
   void AddChosenInstrument(const JInstrumentUnderlying& chosen);
-  // Keyboard shortcut: true when the key is one of the six order keys.
-  bool HandleShortcutKey(int key, Qt::KeyboardModifiers modifiers, bool inTextEntry = false);
   // The font-size menu (616) at its place; runs the chosen command.
   void ShowFontSizeMenu();
   // The tab menu of a right click on tab `index` of a family.
@@ -157,7 +156,7 @@ class CPriceViewAdv : public CAddonView {
   std::uint32_t OnViewMessage(UINT message, LPARAM data) override;
   void resizeEvent(QResizeEvent* e) override;
   void paintEvent(QPaintEvent* e) override;
-  void keyPressEvent(QKeyEvent* e) override;
+  std::optional<std::wstring> ShortcutTicket(addon::TradeSide side) override;
   bool eventFilter(QObject* watched, QEvent* event) override;
 
  private:
@@ -200,9 +199,6 @@ class CPriceViewAdv : public CAddonView {
   void RemoveInstrumentsByMessage(int listKind, const std::vector<InstrumentKey>* keys, int position);
   std::wstring AlreadyInListText() const;
 
-  // Other views and the host.
-  void OpenView(const wchar_t* className, const std::wstring* linkText);
-  LRESULT OpenTradeTicket(const std::wstring* linkText, LPARAM origin);
   void ShowLegend(bool remark);
 
   addon::Membership m_priceViews{addon::OpenPriceViews};
@@ -236,5 +232,4 @@ class CPriceViewAdv : public CAddonView {
   IQuoteGrid* m_grids[2] = {nullptr, nullptr};  // by display mode; the board slots in at 1
   CLSTipDlg* m_lsTip = nullptr;
   CRemTipDlg* m_remTip = nullptr;
-  const QEvent* m_textKeyEvent = nullptr;
 };

@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "addon/Feeds.h"
 #include "addon/LinkText.h"
 #include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
@@ -55,6 +56,7 @@ inline JWatchlistRow Row(int id, const std::string& name, std::int32_t productId
 // binary run on its own gives the same answers as one process per test.
 inline void ResetPriceState() {
   QuoteStore::Instance().Clear();
+  addon::QuoteFeed::Instance().Reset();
   watchlist::ResetForTests();
   CPriceViewAdv::ResetProcessState();
   addon::SettingTextTable::Instance().Clear();

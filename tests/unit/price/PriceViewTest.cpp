@@ -1,6 +1,9 @@
 // The price view through the scripted host: what it asks the terminal for,
 // how it shows and edits watchlists, and how it reacts to the user.
+#include <QKeyEvent>
 #include <QLineEdit>
+
+#include "controls/InstrumentComboBox.h"
 
 #include "PriceFixture.h"
 #include "hostview/Buttons.h"
@@ -46,7 +49,7 @@ TEST_F(PriceView, Activation_ShowsTheFirstUserWatchlistAndAsksRemarksAndMode) {
   // The loaders log their start and end.
   int loaderLines = 0;
   for (const auto& line : host.logs.Texts())
-    if (line.rfind("Info:CPriceViewAdv::LoadWatchlistTabs file:.\\PriceViewAdv.cpp line:", 0) == 0) ++loaderLines;
+    if (line.rfind("Info:CPriceViewAdv::LoadWatchlistTabs file:PriceViewAdv.cpp line:", 0) == 0) ++loaderLines;
   EXPECT_EQ(loaderLines, 2);
   // The brand button carries the "OLDWL" text; the families with lists are offered.
   EXPECT_EQ(static_cast<CHostButton*>(view->Control(CPriceViewAdv::kKeldoButtonId))->GetWindowText(), L"Brand Lists");
@@ -609,33 +612,41 @@ TEST_F(PriceView, Drops_AcceptedOnlyByUserAndBrandFamiliesFromOtherSources) {
 TEST_F(PriceView, Shortcuts_BuyAndSellTheSelectedRowWithItsPriceWhenAboveZero) {
   CPriceViewAdv* view = Make();
   PriceGrid* grid = view->GetPriceGrid();
+  auto press = [&](QWidget* target, int key, Qt::KeyboardModifiers modifiers = Qt::NoModifier) {
+    QKeyEvent e(QEvent::KeyPress, key, modifiers);
+    QApplication::sendEvent(target, &e);
+  };
   Push(view, instruments[0], "ASK", "10.02");
   Push(view, instruments[0], "BID", "0");
   host.ClearRequests();
-  EXPECT_TRUE(view->HandleShortcutKey(Qt::Key_F5, Qt::NoModifier));
+  press(grid, Qt::Key_F5);
   EXPECT_TRUE(host.RequestsOf(hm::OpenView).empty());  // no row selected
   grid->SelectRow(0);
-  view->HandleShortcutKey(Qt::Key_Plus, Qt::KeypadModifier);
-  view->HandleShortcutKey(Qt::Key_Minus, Qt::NoModifier);
+  press(grid, Qt::Key_Plus, Qt::KeypadModifier);
+  press(grid->viewport(), Qt::Key_Minus);
   const auto links = host.RequestsOf(hm::LinkData);
   ASSERT_EQ(links.size(), 2u);
   const auto buy = addon::ReadLinkText(links[0].link->link);
   const auto sell = addon::ReadLinkText(links[1].link->link);
   ASSERT_TRUE(buy && sell);
+  EXPECT_EQ(links[0].link->className, L"CTradeView");
+  EXPECT_EQ(buy->Get("Field_instrument_code"), "D05");
   EXPECT_EQ(buy->Get("Field_side"), "buy");
   EXPECT_EQ(buy->Get("Field_Trade_price"), "10.02");
   EXPECT_EQ(sell->Get("Field_side"), "sell");
   EXPECT_FALSE(sell->Has("Field_Trade_price"));  // a bid of 0 goes without a price
   EXPECT_EQ(host.RequestsOf(hm::ShortcutContext).size(), 2u);
   // In the search box the main-keyboard minus types.
-  EXPECT_FALSE(view->HandleShortcutKey(Qt::Key_Minus, Qt::NoModifier, /*inTextEntry*/ true));
-  // Shortcuts off: consumed, nothing opens.
+  host.ClearRequests();
+  ASSERT_NE(view->InstrumentBox()->lineEdit(), nullptr);
+  press(view->InstrumentBox()->lineEdit(), Qt::Key_Minus);
+  EXPECT_TRUE(host.RequestsOf(hm::OpenView).empty());
+  // Shortcuts off: nothing opens.
   CKeyboardShortcutsSetting off;
   off.SetEnableKeyboardShortcuts(false);
   GetUserSettings().SetKeyboardShortcutsSetting(off);
-  host.ClearRequests();
-  EXPECT_TRUE(view->HandleShortcutKey(Qt::Key_F9, Qt::NoModifier));
-  EXPECT_TRUE(host.Requests().empty());
+  press(grid, Qt::Key_F9);
+  EXPECT_TRUE(host.RequestsOf(hm::OpenView).empty());
 }
 
 TEST_F(PriceView, FontSizeMenu_StoresTheChoiceAndAnnouncesIt) {
