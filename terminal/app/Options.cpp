@@ -159,7 +159,9 @@ Options:
   --instruments N         number of simulated instruments (1 to 500000)
   --rate N                simulated field updates per second
   --snapshot DIR          at the end, write a PNG of the main window and of each view
-  --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv
+  --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv and
+                          the market's quotes of the shown instruments as
+                          DIR/market-quotes.tsv (the market stops first)
   --list-instruments [N]  print the first N simulated instruments (all without N):
                           product id, instrument code, exchange code, name
   -v, --verbose           also print the views' log lines

@@ -16,6 +16,7 @@
 #include "platform/Platform.h"
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
+#include "terminal/host/MarketQuotes.h"
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/SettingsDialog.h"
 #include "terminal/sim/Market.h"
@@ -33,6 +34,8 @@ const QStringList kAddonClasses = {"CPriceViewAdv",   "CMarketDepthAdv",   "CTim
                                    "CTradeSummaryAdv", "CPriceAlertList",  "CNewPriceAlertAdv"};
 constexpr int kPumpMs = 50;
 constexpr double kDefaultHeadlessSeconds = 10;
+// After the market stops: long enough for every view's refresh timer to fire.
+constexpr std::uint32_t kFinalRefreshMs = 1000;
 constexpr int kAutosaveMs = 60 * 1000;
 
 StartParamMap Widen(const std::map<std::string, std::string>& in) {
@@ -325,6 +328,11 @@ int TerminalApp::RunTimed() {
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }
+  // The market stops here; every view refreshes once more from what it was
+  // sent, so that the dumps and the market's files describe one moment.
+  clock.Advance(kFinalRefreshMs);
+  platform::ProcessPosted();
+  QCoreApplication::processEvents();
   int code = 0;
   if (!SaveLayout()) code = 1;
   std::string error;
@@ -332,6 +340,11 @@ int TerminalApp::RunTimed() {
     const int n = DumpGrids(m_options.dumpDir, error);
     if (n < 0) { Progress("error: " + error); code = 1; }
     else Progress("wrote " + std::to_string(n) + (n == 1 ? " grid dump to " : " grid dumps to ") + m_options.dumpDir);
+    const std::string quotes = (fs::path(m_options.dumpDir) / "market-quotes.tsv").string();
+    if (!WriteMarketQuotes(quotes, m_runtime->Market(), m_runtime->QuoteInstruments(), error)) {
+      Progress("error: " + error);
+      code = 1;
+    }
   }
   if (!m_options.snapshotDir.empty()) {
     const int n = Snapshot(m_options.snapshotDir, error);

@@ -967,6 +967,14 @@ std::vector<StoredWatchlist> HostRuntime::Watchlists(StoredWatchlist::Kind kind)
 std::vector<PriceAlertItem> HostRuntime::Alerts() const { return d->alerts.All(); }
 HostStats HostRuntime::Stats() const { return d->stats; }
 
+std::vector<int> HostRuntime::QuoteInstruments() const {
+  std::vector<int> out;
+  std::set<int> seen;
+  for (const auto& s : d->subs)
+    if (s.alive && s.kind == 0 && s.param == 0 && seen.insert(s.instrument).second) out.push_back(s.instrument);
+  return out;
+}
+
 void HostRuntime::OnChildFeedback(CSuperBaseView* v, UINT msg, LPARAM data) {
   Impl::ViewRec* rec = d->Find(v);
   if (!rec) {

@@ -167,6 +167,9 @@ class HostRuntime : public IViewHost {
   std::vector<PriceAlertItem> Alerts() const;
 
   HostStats Stats() const;
+  // The market indexes of the instruments some view holds a quote
+  // subscription for (kind 0, param 0), in subscription order.
+  std::vector<int> QuoteInstruments() const;
 
   // ---- IViewHost -----------------------------------------------------------------
   void OnChildFeedback(CSuperBaseView* view, UINT message, LPARAM data) override;
