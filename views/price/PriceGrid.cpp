@@ -1,7 +1,9 @@
 #include "views/price/PriceGrid.h"
 
 #include <QPaintEvent>
+#include <QHash>
 #include <QPainter>
+#include <QStaticText>
 #include <algorithm>
 #include <numeric>
 
@@ -40,6 +42,36 @@ bool HasValue(const QuoteCell& c) { return c.filled && !c.text.empty(); }
 
 bool IsTradeableStatus(int status) { return status != 0 && status != 1; }
 
+// Whole cells drawn once per look and kept as images: the marker and link
+// columns draw shapes and pictures that do not change from tick to tick.
+class CellTiles {
+ public:
+  template <class Draw>
+  void Paint(QPainter& p, const QRect& rect, QString key, Draw draw) {
+    const qreal dpr = p.device() ? p.device()->devicePixelRatioF() : 1.0;
+    key += QStringLiteral("|%1x%2@%3").arg(rect.width()).arg(rect.height()).arg(dpr);
+    auto it = m_tiles.find(key);
+    if (it == m_tiles.end()) {
+      if (m_tiles.size() > 1024) m_tiles.clear();
+      QImage tile(rect.size() * dpr, QImage::Format_ARGB32_Premultiplied);
+      tile.setDevicePixelRatio(dpr);
+      tile.fill(Qt::transparent);
+      QPainter tp(&tile);
+      tp.setFont(p.font());
+      draw(tp, QRect(QPoint(0, 0), rect.size()));
+      tp.end();
+      it = m_tiles.insert(key, tile);
+    }
+    p.drawImage(rect.topLeft(), it.value());
+  }
+  void Clear() { m_tiles.clear(); }
+
+ private:
+  QHash<QString, QImage> m_tiles;
+};
+
+QString ColorKey(const QColor& c) { return QString::number(c.rgba(), 16); }
+
 // The marker columns: the product's picture (icon) and the direction of the
 // day's change (arrow), both from the cell's parameter.
 class PriceMarkerType : public CGridCellType {
@@ -50,6 +82,17 @@ class PriceMarkerType : public CGridCellType {
   std::wstring GetName() const override { return L"PriceMarker"; }
   void OnDraw(QPainter& p, const QRect& rect, int col, int row, const CGridCell& cell, bool selected,
               bool current) override {
+    const QString key = QStringLiteral("%1|%2|%3|%4|%5|%6|%7")
+                            .arg(cell.number)
+                            .arg(cell.hasParam ? cell.param : -1)
+                            .arg(cell.text.left(1), ColorKey(BackColor(cell, selected)), ColorKey(TextColor(cell, selected)))
+                            .arg(ColorKey(m_grid ? m_grid->GetColors().gridLine : QColor()))
+                            .arg(p.font().key());
+    m_tiles.Paint(p, rect, key, [&](QPainter& tp, const QRect& r) { DrawCell(tp, r, cell, selected); });
+  }
+
+ private:
+  void DrawCell(QPainter& p, const QRect& rect, const CGridCell& cell, bool selected) {
     DrawBackground(p, rect, cell, selected);
     DrawBorder(p, rect);
     if (!cell.hasParam) return;
@@ -76,7 +119,112 @@ class PriceMarkerType : public CGridCellType {
     p.drawText(tag, Qt::AlignCenter, cell.text.left(1));
     p.restore();
   }
+
+  CellTiles m_tiles;
 };
+
+// Headings, with or without the sort arrow: kept as images per text and look.
+template <class Base>
+class PriceHeadingType : public Base {
+ public:
+  using Base::Base;
+  void OnDraw(QPainter& p, const QRect& rect, int col, int row, const CGridCell& cell, bool selected,
+              bool current) override {
+    const CGridCtrl* grid = this->Grid();
+    const QString key = cell.text + QStringLiteral("|%1|%2|%3|%4|%5|%6")
+                                        .arg(cell.number)
+                                        .arg(ColorKey(cell.textColor), ColorKey(cell.backColor))
+                                        .arg(cell.alignment)
+                                        .arg(grid ? grid->GetHeadingFont().key() : QString())
+                                        .arg(grid ? ColorKey(grid->GetColors().headLine) : QString());
+    m_tiles.Paint(p, rect, key, [&](QPainter& tp, const QRect& r) { Base::OnDraw(tp, r, col, row, cell, selected, current); });
+  }
+
+ private:
+  CellTiles m_tiles;
+};
+
+// The link column: the company-information button, kept as an image per look.
+class PriceLinkType : public PArrowButtonTypeEx {
+ public:
+  using PArrowButtonTypeEx::PArrowButtonTypeEx;
+  void OnDraw(QPainter& p, const QRect& rect, int col, int row, const CGridCell& cell, bool selected,
+              bool current) override {
+    const QString key = QStringLiteral("%1|%2|%3|%4|%5")
+                            .arg(cell.flags & CGridCell::kFlagPressed ? 1 : 0)
+                            .arg(ColorKey(BackColor(cell, selected)))
+                            .arg(ColorKey(m_grid ? m_grid->GetColors().gridLine : QColor()))
+                            .arg(StyleID())
+                            .arg(quintptr(StyleManager()));
+    m_tiles.Paint(p, rect, key, [&](QPainter& tp, const QRect& r) {
+      PArrowButtonTypeEx::OnDraw(tp, r, col, row, cell, selected, current);
+    });
+  }
+
+ private:
+  CellTiles m_tiles;
+};
+
+}  // namespace
+
+// The data cells: background, the right and bottom border, then the text.
+// Texts are laid out once and kept (QStaticText): a quote table redraws the
+// same few thousand texts many times a second, and laying text out is the
+// costly part of drawing it.
+class PriceTextType : public CGridCellType {
+ public:
+  using CGridCellType::CGridCellType;
+  std::wstring GetName() const override { return L"PriceText"; }
+  void SetFont(const QFont& font) {
+    m_font = font;
+    m_texts.clear();
+    const QFontMetrics fm(font);
+    m_textHeight = fm.height();
+  }
+  void OnDraw(QPainter& p, const QRect& rect, int, int, const CGridCell& cell, bool selected, bool) override {
+    // The grid lines are drawn once over all cells (PriceGrid::paintEvent).
+    p.fillRect(rect, BackColor(cell, selected));
+    if (cell.text.isEmpty()) return;
+    const QStaticText& text = Prepared(cell.text);
+    const QRect area = rect.adjusted(3, 0, -4, -1);
+    const qreal width = text.size().width();
+    qreal x = area.left();
+    if (cell.alignment & Qt::AlignRight) x = area.right() + 1 - width;
+    else if (cell.alignment & Qt::AlignHCenter) x = area.left() + (area.width() - width) / 2;
+    const qreal y = area.top() + (area.height() - m_textHeight) / 2.0;
+    if (p.font() != m_font) p.setFont(m_font);
+    const QColor color = TextColor(cell, selected);
+    if (p.pen().color() != color || p.pen().style() != Qt::SolidLine) p.setPen(color);
+    if (width > area.width()) {
+      // Too wide: cut at the cell's edge.
+      p.save();
+      p.setClipRect(area, Qt::IntersectClip);
+      p.drawStaticText(QPointF(area.left(), y), text);
+      p.restore();
+      return;
+    }
+    p.drawStaticText(QPointF(x, y), text);
+  }
+
+ private:
+  const QStaticText& Prepared(const QString& text) {
+    auto it = m_texts.find(text);
+    if (it != m_texts.end()) return it.value();
+    // Prices move: the cache is dropped now and then rather than grown forever.
+    if (m_texts.size() > 20000) m_texts.clear();
+    QStaticText st(text);
+    st.setTextFormat(Qt::PlainText);
+    st.setPerformanceHint(QStaticText::AggressiveCaching);
+    st.prepare(QTransform(), m_font);
+    return m_texts.insert(text, st).value();
+  }
+
+  QFont m_font;
+  int m_textHeight = 12;
+  QHash<QString, QStaticText> m_texts;
+};
+
+namespace {
 
 QColor ProductColor(const std::string& type) {
   if (type == "CFD") return QColor(200, 110, 20);
@@ -89,7 +237,14 @@ QColor ProductColor(const std::string& type) {
 
 }  // namespace
 
-PriceGrid::PriceGrid(QWidget* parent) : CGridCtrl(parent), m_markerType(std::make_unique<PriceMarkerType>(this)) {
+PriceGrid::PriceGrid(QWidget* parent)
+    : CGridCtrl(parent),
+      m_markerType(std::make_unique<PriceMarkerType>(this)),
+      m_textType(std::make_unique<PriceTextType>(this)),
+      m_linkType(std::make_unique<PriceLinkType>(this)),
+      m_headingType(std::make_unique<PriceHeadingType<CGridHeadingType>>(this)),
+      m_sortArrowType(std::make_unique<PriceHeadingType<PSortArrowTypeEx>>(this)) {
+  SetDefCellType(m_textType.get());
   SetSelectionMode(MultiSelection);
   SetSH_Width(0);
   SetHighlightSelection(false);
@@ -104,7 +259,7 @@ PriceGrid::PriceGrid(QWidget* parent) : CGridCtrl(parent), m_markerType(std::mak
   m_palette.fallBack = QColor(255, 210, 210);
   m_palette.changedBack = QColor(255, 236, 160);
   m_palette.changedText = QColor(0, 0, 0);
-  m_sortArrowType.SetUseThemes(false);
+  m_sortArrowType->SetUseThemes(false);
   m_font = GetDefFont();
   ApplyColumns();
 }
@@ -377,7 +532,6 @@ void PriceGrid::ApplyColumns() {
     m_columns.push_back(std::move(c));
   }
   SetNumberCols(int(m_columns.size()));
-  for (std::size_t i = 0; i < items.size(); ++i) SetColWidth(int(i), std::max(0, items[i].width));
   // The sorted column keeps its sort when it is still shown.
   m_sortCol = sortedKey == Col::Unknown ? -1 : ColumnOf(sortedKey);
   if (m_sortCol < 0) m_sortFlag = 0;
@@ -385,12 +539,20 @@ void PriceGrid::ApplyColumns() {
   m_font = m_style ? m_style->GetFont(16) : QFont();
   m_font.setPointSize(pricecol::FontPointSize());
   SetDefFont(m_font);
+  m_textType->SetFont(m_font);
   QFont heading = m_style ? m_style->GetFont(17) : m_font;
   heading.setPointSize(pricecol::FontPointSize());
   SetHeadingFont(heading);
   const int height = std::max(kMinRowHeight, QFontMetrics(m_font).height() + 6);
   SetDefRowHeight(height);
   SetTH_Height(std::max(kMinRowHeight, QFontMetrics(heading).height() + 6));
+  // A heading is never cut: its column is at least as wide as its text and
+  // the sort arrow (the stored width is kept for the settings).
+  const QFontMetrics headingMetrics(heading);
+  for (std::size_t i = 0; i < items.size(); ++i) {
+    const int needed = m_columns[i].heading.isEmpty() ? 0 : headingMetrics.horizontalAdvance(m_columns[i].heading) + 24;
+    SetColWidth(int(i), std::max(std::max(0, items[i].width), needed));
+  }
   AskMarketDelays();
   RedrawAll();
 }
@@ -419,7 +581,7 @@ void PriceGrid::SetStyleManager(IStyleManager* style) {
   c.headText = m_headText;
   if (style) c.gridLine = style->Color(kLineColor);
   SetColors(c);
-  m_linkType.SetStyleManager(style, style ? style->GetStyleID() : 0);
+  m_linkType->SetStyleManager(style, style ? style->GetStyleID() : 0);
   ApplyColumns();
 }
 
@@ -456,13 +618,35 @@ void PriceGrid::SetEmptyText(const std::wstring& text) {
 
 void PriceGrid::paintEvent(QPaintEvent* e) {
   CGridCtrl::paintEvent(e);
-  if (m_emptyText.empty() || !m_rows.empty()) return;
   QPainter p(viewport());
+  PaintGridLines(p, e->rect());
+  if (m_emptyText.empty() || !m_rows.empty()) return;
   const QRect area(8, GetTH_Height() + 8, viewport()->width() - 16, std::max(0, viewport()->height() - GetTH_Height() - 16));
   if (area.width() <= 0 || area.height() <= 0) return;
   p.setFont(GetDefFont());
   p.setPen(m_palette.text);
   p.drawText(area, Qt::AlignHCenter | Qt::AlignTop | Qt::TextWordWrap, Q(m_emptyText));
+}
+
+void PriceGrid::PaintGridLines(QPainter& p, const QRect& clip) {
+  const int top = GetTopRow(), bottom = GetBottomRow(), left = GetLeftCol(), right = GetRightCol();
+  if (top < 0 || left < 0) return;
+  const QRect first = CellRect(left, top), last = CellRect(right, bottom);
+  const QRect area = QRect(0, GetTH_Height(), viewport()->width(), viewport()->height() - GetTH_Height()) & clip;
+  if (area.isEmpty()) return;
+  p.save();
+  p.setClipRect(area);
+  p.setPen(QPen(GetColors().gridLine, 0));
+  // One line per row and per column instead of two per cell.
+  for (int c = left; c <= right; ++c) {
+    const QRect r = CellRect(c, top);
+    if (r.width() > 0) p.drawLine(r.right(), first.top(), r.right(), last.bottom());
+  }
+  for (int row = top; row <= bottom; ++row) {
+    const int y = first.top() + (row - top) * GetDefRowHeight() + GetDefRowHeight() - 1;
+    p.drawLine(first.left(), y, last.right(), y);
+  }
+  p.restore();
 }
 
 // ---- Cells ------------------------------------------------------------------------------------
@@ -528,10 +712,10 @@ void PriceGrid::OnGetCell(int col, int row, CGridCell& cell) {
     cell.SetTextColor(m_headText);
     cell.SetBackColor(m_headBack);
     if (col == m_sortCol) {
-      cell.SetCellType(&m_sortArrowType);
+      cell.SetCellType(m_sortArrowType.get());
       cell.SetNumber(m_sortFlag ? 0 : 1);
     } else {
-      cell.SetCellType(&m_headingType);
+      cell.SetCellType(m_headingType.get());
     }
     return;
   }
@@ -543,7 +727,6 @@ void PriceGrid::OnGetCell(int col, int row, CGridCell& cell) {
   cell.SetBackColor(back);
   cell.SetTextColor(text);
   cell.SetAlignment((column.info->rightAligned ? Qt::AlignRight : Qt::AlignLeft) | Qt::AlignVCenter);
-  cell.SetFont(m_font);
   const QuoteRecord& quote = m_quotes[std::size_t(row)];
   switch (column.col) {
     case Col::Icon:
@@ -556,7 +739,7 @@ void PriceGrid::OnGetCell(int col, int row, CGridCell& cell) {
       }
       return;
     case Col::Link:
-      cell.SetCellType(&m_linkType);
+      cell.SetCellType(m_linkType.get());
       return;
     case Col::Arrow: {
       cell.SetCellType(m_markerType.get());

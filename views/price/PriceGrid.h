@@ -38,6 +38,7 @@
 
 class CSuperBaseView;
 class IStyleManager;
+class PriceTextType;
 
 class PriceGrid : public CGridCtrl, public IQuoteGrid {
   Q_OBJECT
@@ -189,6 +190,7 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   void QuoteCellColors(const Column& column, const QuoteCell& value, bool selected, CGridCell& cell) const;
   QString QuoteText(const Column& column, const QuoteCell& value) const;
   void SendToOwner(UINT message, WPARAM wParam, LPARAM lParam);
+  void PaintGridLines(QPainter& p, const QRect& clip);
   std::wstring LinkTextFor(const Row& row) const;
   int CurrentListPosition() const;
 
@@ -211,8 +213,9 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   QColor m_headBack{58, 74, 99}, m_headText{255, 255, 255};
   IStyleManager* m_style = nullptr;
   QFont m_font;
-  CGridHeadingType m_headingType{this};
-  PSortArrowTypeEx m_sortArrowType{this};
-  PArrowButtonTypeEx m_linkType{this};
-  std::unique_ptr<CGridCellType> m_markerType;  // icon and arrow columns
+  std::unique_ptr<CGridCellType> m_markerType;      // icon and arrow columns
+  std::unique_ptr<PriceTextType> m_textType;        // every other data cell
+  std::unique_ptr<PArrowButtonTypeEx> m_linkType;   // the link column
+  std::unique_ptr<CGridHeadingType> m_headingType;  // headings
+  std::unique_ptr<PSortArrowTypeEx> m_sortArrowType;  // the sorted column's heading
 };
