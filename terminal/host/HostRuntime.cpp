@@ -15,6 +15,7 @@
 #include "hostview/MessageIds.h"
 #include "hostview/Text.h"
 #include "platform/Platform.h"
+#include "terminal/host/AlertDesk.h"
 #include "terminal/host/Services.h"
 #include "terminal/host/WatchlistXml.h"
 #include "terminal/sim/Market.h"
@@ -145,6 +146,10 @@ bool MemoryHostStore::LoadAlerts(std::vector<PriceAlertItem>& out) {
 }
 void MemoryHostStore::SaveAlerts(const std::vector<PriceAlertItem>& a) {
   alerts = a;
+  // The history goes with its alert.
+  std::erase_if(firings, [&](const AlertFiring& f) {
+    return std::none_of(a.begin(), a.end(), [&](const PriceAlertItem& x) { return x.alertId == f.alertId; });
+  });
   alertsSaved = true;
   ++saveCount;
 }
@@ -165,7 +170,7 @@ struct HostRuntime::Impl {
   IHostStore* store = nullptr;
   HostSettings settings;
   std::unique_ptr<sim::Market> market;
-  sim::AlertBook alerts;
+  std::unique_ptr<AlertDesk> alerts;
   std::unique_ptr<LanguageTable> language;
   std::unique_ptr<StyleManager> styles;
   std::unique_ptr<::term::LogFactory> log;
@@ -227,8 +232,6 @@ struct HostRuntime::Impl {
   std::vector<StoredWatchlist> userLists, brandLists;
   std::int32_t nextWatchlistId = 1001;
   bool relaying300 = false;
-  std::uint32_t lastAlertCheck = 0;
-  bool pumped = false;
 
   // ---- views ----
   ViewRec* Find(const CSuperBaseView* v) {
@@ -275,7 +278,7 @@ struct HostRuntime::Impl {
   }
   void SaveAlerts() {
     try {
-      store->SaveAlerts(alerts.All());
+      store->SaveAlerts(alerts->All());
     } catch (const std::exception& e) {
       log->Error(std::string("saving alerts failed: ") + e.what());
     }
@@ -542,7 +545,7 @@ void HostRuntime::Impl::LoadUserData() {
   } catch (const std::exception& e) {
     log->Error(std::string("loading alerts failed: ") + e.what());
   }
-  alerts.Load(std::move(stored2));
+  alerts->Load(std::move(stored2));
 }
 
 std::vector<JWatchlistRow> HostRuntime::Impl::UserRows() const {
@@ -713,19 +716,18 @@ void HostRuntime::Impl::OnSaveBrandItems(CSuperBaseView* v, const WatchlistFeedb
 
 void HostRuntime::Impl::CheckAlerts() {
   bool changed = false;
-  const auto fired = alerts.Evaluate(*market, &changed);
-  for (const auto& f : fired) {
+  for (const AlertFiring& f : alerts->Collect(&changed)) {
     ++stats.alertsFired;
-    const int idx = market->Find(f.alert.productId, f.alert.instrumentCode);
-    const std::string name = idx >= 0 ? market->Instruments()[std::size_t(idx)].instrumentName : f.alert.instrumentCode;
-    const std::string field = f.alert.priceField == "ASK" ? "Ask" : f.alert.priceField == "BID" ? "Bid" : "Last done";
-    const std::string text = "Price alert: " + name + " (" + f.alert.instrumentCode + ") " + field + " " +
-                             f.alert.hostTextB + " " + (f.alert.comparator == "<=" ? "<=" : ">=") + " " +
-                             market->FormatPrice(idx, f.alert.triggerValue);
-    log->Info(text);
-    if (f.alert.viaApp) shell->ShowNotice(options.appTitle, hv::Widen(text));
-    if (f.alert.viaEmail) log->Info("alert " + std::to_string(f.alert.alertId) + ": e-mail notice queued");
-    if (f.alert.viaSms) log->Info("alert " + std::to_string(f.alert.alertId) + ": SMS notice queued");
+    log->Info(f.notice);
+    const PriceAlertItem* a = alerts->Find(f.alertId);
+    if (a && a->viaApp) shell->ShowNotice(options.appTitle, hv::Widen(f.notice));
+    if (a && a->viaEmail) log->Info("alert " + std::to_string(f.alertId) + ": e-mail notice queued");
+    if (a && a->viaSms) log->Info("alert " + std::to_string(f.alertId) + ": SMS notice queued");
+    try {
+      store->SaveAlertFiring(f);
+    } catch (const std::exception& e) {
+      log->Error(std::string("saving an alert firing failed: ") + e.what());
+    }
   }
   if (changed) AlertsChanged(hm::Alert703);
 }
@@ -765,6 +767,7 @@ HostRuntime::HostRuntime(const HostOptions& options, IHostShell* shell, IHostSto
   config.sessionStartSeconds = options.sessionStartSeconds;
   config.startTick = platform::TickCount();
   d->market = std::make_unique<sim::Market>(config);
+  d->alerts = std::make_unique<AlertDesk>(*d->market);
   d->language = std::make_unique<LanguageTable>();
   std::string imageDir = options.imageDir;
   if (imageDir.empty()) imageDir = QDir::tempPath().toStdString() + "/terminal-images";
@@ -891,12 +894,8 @@ void HostRuntime::Pump(std::uint32_t now) {
   std::vector<std::pair<CSuperBaseView*, FieldUpdate>> pushes;
   d->CollectPushes(pushes);
   d->DeliverUpdates(pushes, hm::FieldValue);
-  // Alerts, twice a second.
-  if (!d->pumped || now - d->lastAlertCheck >= 500) {
-    d->lastAlertCheck = now;
-    d->CheckAlerts();
-  }
-  d->pumped = true;
+  // Alerts: crossings were caught while the market moved; notices and saves now.
+  d->CheckAlerts();
 }
 
 void HostRuntime::PumpNow() { Pump(platform::TickCount()); }
@@ -964,7 +963,7 @@ std::string HostRuntime::ImageDir() const { return d->styles->ImageDir(); }
 std::vector<StoredWatchlist> HostRuntime::Watchlists(StoredWatchlist::Kind kind) const {
   return kind == StoredWatchlist::Brand ? d->brandLists : d->userLists;
 }
-std::vector<PriceAlertItem> HostRuntime::Alerts() const { return d->alerts.All(); }
+std::vector<PriceAlertItem> HostRuntime::Alerts() const { return d->alerts->All(); }
 HostStats HostRuntime::Stats() const { return d->stats; }
 
 void HostRuntime::OnChildFeedback(CSuperBaseView* v, UINT msg, LPARAM data) {
@@ -1180,7 +1179,7 @@ void HostRuntime::OnChildFeedback(CSuperBaseView* v, UINT msg, LPARAM data) {
       return;
     }
     case hm::Alert701: {
-      const std::vector<PriceAlertItem> list = d->alerts.All();
+      const std::vector<PriceAlertItem> list = d->alerts->All();
       d->Deliver(v, hm::Alert701, ToLParam(&list));
       return;
     }
@@ -1191,7 +1190,7 @@ void HostRuntime::OnChildFeedback(CSuperBaseView* v, UINT msg, LPARAM data) {
         d->log->Warn("alert without an instrument refused");
         return;
       }
-      const std::int32_t id = d->alerts.Create(item);
+      const std::int32_t id = d->alerts->Create(item);
       d->log->Info("alert " + std::to_string(id) + " created for " + item.instrumentCode);
       d->AlertsChanged(hm::Alert702);
       return;
@@ -1199,7 +1198,7 @@ void HostRuntime::OnChildFeedback(CSuperBaseView* v, UINT msg, LPARAM data) {
     case hm::Alert703: {
       if (!data) return;
       const PriceAlertItem& item = *FromLParam<const PriceAlertItem>(data);
-      if (!d->alerts.Update(item)) {
+      if (!d->alerts->Update(item)) {
         d->log->Warn("change of unknown alert " + std::to_string(item.alertId) + " ignored");
         return;
       }
@@ -1208,7 +1207,7 @@ void HostRuntime::OnChildFeedback(CSuperBaseView* v, UINT msg, LPARAM data) {
     }
     case hm::Alert704: {
       if (!data) return;
-      const int n = d->alerts.Remove(*FromLParam<const std::vector<std::int32_t>>(data));
+      const int n = d->alerts->Remove(*FromLParam<const std::vector<std::int32_t>>(data));
       if (n > 0) d->AlertsChanged(hm::Alert704);
       return;
     }

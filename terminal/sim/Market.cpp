@@ -249,6 +249,8 @@ struct Market::Impl {
   int interestTotal = 0;
   std::vector<std::uint8_t> dirty;
   std::vector<int> dirtyList;
+  std::vector<int> priceWatch;  // per base index: watchers of its prices
+  PriceListener priceListener;
   Rng rng{0};
   std::uint32_t now = 0;
   std::uint64_t elapsedMs = 0;  // since the start of the session
@@ -554,6 +556,7 @@ void Market::Impl::Build() {
   tapes.assign(n, {});
   interest.assign(n, 0);
   dirty.assign(n, 0);
+  priceWatch.assign(n, 0);
   for (int i : bases) {
     History(i, state[i], nullptr);
     Rng rr(StreamSeed(config.seed, std::uint64_t(i), 0xBEEF));
@@ -705,6 +708,7 @@ void Market::Impl::Event(int i, Rng& r) {
     ++s.version;
     MarkDirty(i, kBookChanged);
   }
+  if (priceWatch[i] > 0 && priceListener) priceListener(i);
 }
 
 void Market::Impl::StepOnce() {
@@ -820,6 +824,20 @@ std::string Market::DateText() const {
 }
 std::string Market::TimeText() const { return Clock(d->TimeOfDay()); }
 std::uint32_t Market::TimeOfDayMs() const { return d->TimeOfDay(); }
+
+int Market::BaseOf(int index) const {
+  if (index < 0 || index >= int(d->instruments.size())) return -1;
+  return d->Base(index);
+}
+void Market::SetPriceListener(PriceListener listener) { d->priceListener = std::move(listener); }
+void Market::WatchPrices(int index) {
+  const int b = BaseOf(index);
+  if (b >= 0) ++d->priceWatch[b];
+}
+void Market::UnwatchPrices(int index) {
+  const int b = BaseOf(index);
+  if (b >= 0 && d->priceWatch[b] > 0) --d->priceWatch[b];
+}
 
 void Market::AddInterest(int index) {
   if (index < 0 || index >= int(d->instruments.size())) return;
@@ -1155,88 +1173,5 @@ std::vector<int> Market::WorldIndices() const {
 const std::vector<StarterWatchlist>& Market::StarterWatchlists() const { return d->starters; }
 
 // ---------------------------------------------------------------------------
-
-void AlertBook::Load(std::vector<PriceAlertItem> alerts) {
-  alerts_ = std::move(alerts);
-  conditionWasTrue_.assign(alerts_.size(), false);
-  nextId_ = 1;
-  for (const auto& a : alerts_) nextId_ = std::max(nextId_, a.alertId + 1);
-}
-
-std::int32_t AlertBook::Create(PriceAlertItem item) {
-  item.alertId = nextId_++;
-  item.status = "Active";
-  item.hostTextA.clear();
-  item.hostTextB.clear();
-  item.hostNumber = 0;
-  alerts_.push_back(std::move(item));
-  conditionWasTrue_.push_back(false);
-  return alerts_.back().alertId;
-}
-
-bool AlertBook::Update(const PriceAlertItem& item) {
-  for (std::size_t k = 0; k < alerts_.size(); ++k) {
-    if (alerts_[k].alertId != item.alertId) continue;
-    PriceAlertItem kept = item;
-    // A changed alert watches again from now on.
-    kept.status = "Active";
-    kept.hostTextA = alerts_[k].hostTextA;
-    kept.hostTextB = alerts_[k].hostTextB;
-    kept.hostNumber = alerts_[k].hostNumber;
-    alerts_[k] = std::move(kept);
-    conditionWasTrue_[k] = false;
-    return true;
-  }
-  return false;
-}
-
-int AlertBook::Remove(const std::vector<std::int32_t>& ids) {
-  int removed = 0;
-  for (std::size_t k = alerts_.size(); k-- > 0;) {
-    if (std::find(ids.begin(), ids.end(), alerts_[k].alertId) == ids.end()) continue;
-    alerts_.erase(alerts_.begin() + long(k));
-    conditionWasTrue_.erase(conditionWasTrue_.begin() + long(k));
-    ++removed;
-  }
-  return removed;
-}
-
-const PriceAlertItem* AlertBook::Find(std::int32_t id) const {
-  for (const auto& a : alerts_) if (a.alertId == id) return &a;
-  return nullptr;
-}
-
-std::vector<AlertBook::Fired> AlertBook::Evaluate(Market& market, bool* changed) {
-  std::vector<Fired> fired;
-  bool any = false;
-  const std::string today = market.DateText();
-  for (std::size_t k = 0; k < alerts_.size(); ++k) {
-    PriceAlertItem& a = alerts_[k];
-    const bool live = a.status == "Active" || (a.status == "Triggered" && !a.triggerOnce);
-    if (!live) continue;
-    if (!a.validUntil.empty() && a.validUntil < today) {
-      a.status = "Expired";
-      any = true;
-      continue;
-    }
-    const int idx = market.Find(a.productId, a.instrumentCode);
-    if (idx < 0) continue;
-    const Quote q = market.QuoteOf(idx);
-    const double v = a.priceField == "ASK" ? q.ask : a.priceField == "BID" ? q.bid : q.last;
-    if (v <= 0) continue;
-    const bool holds = a.comparator == "<=" ? v <= a.triggerValue + 1e-9 : v >= a.triggerValue - 1e-9;
-    if (holds && !conditionWasTrue_[k]) {
-      a.status = "Triggered";
-      a.hostNumber += 1;
-      a.hostTextA = today + " " + market.TimeText();
-      a.hostTextB = market.FormatPrice(idx, v);
-      fired.push_back({a, v});
-      any = true;
-    }
-    conditionWasTrue_[k] = holds;
-  }
-  if (changed) *changed = any;
-  return fired;
-}
 
 }  // namespace sim

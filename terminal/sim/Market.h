@@ -10,12 +10,12 @@
 //
 // Plain C++, no Qt, single-threaded.
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "hostview/AlertRecords.h"
 #include "hostview/HostLists.h"
 #include "hostview/Records.h"
 
@@ -136,6 +136,18 @@ class Market {
   // The same with what changed about each.
   std::vector<std::pair<int, std::uint32_t>> TakeChangedWithBits();
 
+  // ---- Price watch -------------------------------------------------------------------
+  // The instrument whose prices an instrument shows (a brand twin shows its
+  // original's); `index` itself for most.
+  int BaseOf(int index) const;
+  // Called inside AdvanceTo after every event that may move the bid, ask or
+  // last price of a watched instrument, with its base index; the market time
+  // is the time of the change. Counted: Watch twice needs Unwatch twice.
+  using PriceListener = std::function<void(int baseIndex)>;
+  void SetPriceListener(PriceListener listener);
+  void WatchPrices(int index);
+  void UnwatchPrices(int index);
+
   // ---- Values ---------------------------------------------------------------------
   Quote QuoteOf(int index);
   DepthLevel Depth(int index, int level);   // level 1..99
@@ -169,37 +181,6 @@ class Market {
 
  private:
   std::unique_ptr<Impl> d;
-};
-
-// Keeps the price alerts and moves them through their states.
-class AlertBook {
- public:
-  // Replaces all alerts (loaded from the store); the next id follows the highest.
-  void Load(std::vector<PriceAlertItem> alerts);
-  // Returns the new id; status becomes "Active".
-  std::int32_t Create(PriceAlertItem item);
-  // False when the id is unknown. The status stays the terminal's.
-  bool Update(const PriceAlertItem& item);
-  // Number of alerts removed.
-  int Remove(const std::vector<std::int32_t>& ids);
-  const std::vector<PriceAlertItem>& All() const { return alerts_; }
-  const PriceAlertItem* Find(std::int32_t id) const;
-
-  struct Fired {
-    PriceAlertItem alert;  // after the change
-    double value = 0;
-  };
-  // Checks every live alert against the market at its current time: an alert
-  // whose validUntil lies before the session date becomes "Expired"; one whose
-  // condition holds becomes "Triggered" (a repeating alert fires again each time
-  // the condition turns true again). Returns the alerts that fired; `changed`
-  // is set when any status changed.
-  std::vector<Fired> Evaluate(Market& market, bool* changed);
-
- private:
-  std::vector<PriceAlertItem> alerts_;
-  std::vector<bool> conditionWasTrue_;
-  std::int32_t nextId_ = 1;
 };
 
 }  // namespace sim
