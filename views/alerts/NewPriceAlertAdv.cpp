@@ -53,12 +53,12 @@ QString Q(const std::wstring& s) { return QString::fromStdWString(s); }
 
 const addon::ViewClassInfo& CNewPriceAlertAdv::Info() {
   static const addon::ViewClassInfo info{
-      "CNewPriceAlertAdv",
-      "NewPriceAlertAdv.cpp",
-      725,
-      L"New Price Alert",
-      {{hm::SystemParameter, "ALEML"}, {hm::SystemParameter, "ALSMS"}, {hm::SystemParameter, "MAXPA"}},
-      {addon::RefStore::Products, addon::RefStore::Instruments},
+      .className = "CNewPriceAlertAdv",
+      .titleEntry = 725,
+      .defaultTitle = L"New Price Alert",
+      .firstSettings = {{hm::SystemParameter, "ALEML"}, {hm::SystemParameter, "ALSMS"}, {hm::SystemParameter, "MAXPA"}},
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .descriptor = &classCNewPriceAlertAdv,
   };
   return info;
 }

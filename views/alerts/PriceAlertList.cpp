@@ -30,12 +30,11 @@ constexpr int kBarHeight = kButtonHeight + 2 * kMargin;
 
 const addon::ViewClassInfo& CPriceAlertList::Info() {
   static const addon::ViewClassInfo info{
-      "CPriceAlertList",
-      "PriceAlertList.cpp",
-      9,
-      L"Price Alerts",
-      {},
-      {addon::RefStore::Products, addon::RefStore::Instruments},
+      .className = "CPriceAlertList",
+      .titleEntry = 9,
+      .defaultTitle = L"Price Alerts",
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .descriptor = &classCPriceAlertList,
   };
   return info;
 }
