@@ -3,6 +3,7 @@
 #include <QScrollBar>
 #include <algorithm>
 
+#include "addon/Feeds.h"
 #include "addon/TextTables.h"
 #include "data/MarketDelayCache.h"
 #include "data/QuoteStore.h"
@@ -230,13 +231,7 @@ std::set<InstrumentKey> AlertGrid::InstrumentKeys() const {
 }
 
 std::uint64_t AlertGrid::QuoteVersion() const {
-  const std::set<InstrumentKey> keys = InstrumentKeys();
-  return QuoteStore::Instance().Read([&](const QuoteStore::Reader& rd) {
-    std::uint64_t newest = 0;
-    for (const InstrumentKey& k : keys)
-      if (const QuoteRecord* r = rd.Find(k)) newest = std::max<std::uint64_t>(newest, r->version);
-    return newest;
-  });
+  return addon::QuoteFeed::Instance().NewestStamp(InstrumentKeys());
 }
 
 std::wstring AlertGrid::HeadingText(int position) const {
@@ -340,10 +335,10 @@ void AlertGrid::FillDataCell(int position, const PriceAlertItem& alert, CGridCel
       cell.SetText(alerts::ConditionText(alert, InstrumentDecimals(KeyOf(alert))));
       return;
     case kCurValue: {
-      const QuoteRecord quote = QuoteStore::Instance().Get(KeyOf(alert), platform::TickCount());
       const int field = alerts::FieldIndex(alert.priceField);
       const QuoteLayout::Field f = field == 0 ? QuoteLayout::Ask : field == 1 ? QuoteLayout::Bid : QuoteLayout::Last;
-      cell.SetText(quote[f].text);
+      QuoteCell value;
+      if (addon::QuoteFeed::Instance().ReadCell(KeyOf(alert), f, value)) cell.SetText(value.text);
       cell.SetAlignment(Qt::AlignRight | Qt::AlignVCenter);
       return;
     }

@@ -12,6 +12,7 @@
 #include "addon/TextTables.h"
 #include "controls/CellTypes.h"
 #include "controls/InstrumentComboBox.h"
+#include "addon/Feeds.h"
 #include "data/QuoteStore.h"
 #include "data/ReferenceStores.h"
 #include "hostview/Buttons.h"
@@ -88,10 +89,7 @@ void CNewPriceAlertAdv::BuildControls() {
   m_explorer->SetBkColor(kExplorerBack);
   m_explorer->SetTooltipText(L"Instrument Explorer");
   m_explorer->setFocusPolicy(Qt::NoFocus);
-  connect(m_explorer, &CHostButton::commandClicked, this, [this](int) {
-    const std::wstring name = L"CInsExpViewEx";
-    SendChildFeedback(hm::OpenView, ToLParam(&name));
-  });
+  connect(m_explorer, &CHostButton::commandClicked, this, [this](int) { Actions().OpenInstrumentExplorer(); });
 
   auto list = [this](int id, const char* name) {
     auto* c = new CSkinComboBox(this);
@@ -310,18 +308,12 @@ void CNewPriceAlertAdv::OnDeactivate() {
 
 std::uint32_t CNewPriceAlertAdv::OnViewMessage(UINT message, LPARAM data) {
   switch (message) {
-    case hm::InstrumentList: {
-      const auto* msg = FromLParam<const JInstrumentListMsg>(data);
-      InstrumentMgr_ReadOnly().Fill(msg->instruments);
+    case hm::InstrumentList:  // the base filed it in the instrument store
       ReloadComboList(true);
       return 1;
-    }
-    case hm::ProductList: {
-      const auto* msg = FromLParam<const JProductListMsg>(data);
-      if (msg->products) ProductMgr().Fill(*msg->products);
-      ReloadComboList(true);  // the combo box keeps a copy of the product map
+    case hm::ProductList:  // the combo box keeps a copy of the product map
+      ReloadComboList(true);
       return 1;
-    }
     case hm::FieldValue:
     case hm::RequestField:
       ApplyQuote(*FromLParam<const FieldUpdate>(data));
@@ -419,7 +411,9 @@ void CNewPriceAlertAdv::LoadAlert(std::int32_t id) {
   const auto* instrument = InstrumentMgr_ReadOnly().FindPtr(InstrumentKey{alert.productId, hv::Widen(alert.instrumentCode)});
   if (instrument) {
     m_current = *instrument;
-    if (m_combo) m_combo->SelectByKey(*instrument);
+    if (m_combo && m_instrumentList) m_combo->SelectByKey(*instrument);
+    addon::QuoteFeed::Instance().Register(InstrumentKey{instrument->productId, hv::Widen(instrument->instrumentCode)},
+                                          {}, platform::TickCount());
   }
   m_viaApp = alert.viaApp;
   m_viaEmail = alert.viaEmail;
@@ -494,9 +488,8 @@ void CNewPriceAlertAdv::ChooseInstrument(const JInstrumentUnderlying& instrument
   // The record may live in a list the terminal replaces while we ask it things.
   const JInstrumentUnderlying chosen = instrument;
   if (chosen.productId != -1) {
-    const int status = QueryAltStatus() ? chosen.altAccessStatus : chosen.accessStatus;
-    if (status == 0 || status == 2) {
-      ShowMessage(kNotViewableText);
+    if (!addon::IsViewableStatus(Actions().AccessStatusOf(chosen))) {
+      ShowMessage(addon::kNotViewableText);
       if (m_combo && m_instrumentList) {
         m_combo->AttachList(m_instrumentList, CInstrumentComboBox::ProductMapFromStore());
         m_combo->ShowPlaceholder();
@@ -508,10 +501,9 @@ void CNewPriceAlertAdv::ChooseInstrument(const JInstrumentUnderlying& instrument
   MakeCurrent(chosen);
   if (m_price) m_price->Clear();
   update();
-  // The quotes of the panel: withdraw, fetch once, then subscribe.
+  // The quotes of the panel, asked now: withdraw, fetch once, then subscribe.
   const InstrumentKey key{chosen.productId, hv::Widen(chosen.instrumentCode)};
-  QuoteStore::Instance().Get(key, platform::TickCount());
-  QuoteStore::Instance().TakePending(std::set<InstrumentKey>{key});
+  addon::QuoteFeed::Instance().TakePending(std::set<InstrumentKey>{key});
   addon::SendInterestBatches(Sender(), addon::FieldTarget{chosen.productId, chosen.instrumentCode},
                              addon::AlertInterest());
 }
@@ -536,9 +528,9 @@ void CNewPriceAlertAdv::MakeCurrent(const JInstrumentUnderlying& instrument) {
   if (m_combo && m_instrumentList) m_combo->SelectByKey(instrument);
   SendPriceInfoRequest();
   m_redrawVersion = 0;
-  // The panel's quotes: an instrument new to the quote store is subscribed on the next tick.
-  QuoteStore::Instance().Get(InstrumentKey{instrument.productId, hv::Widen(instrument.instrumentCode)},
-                             platform::TickCount());
+  // The panel's quotes, subscribed on the next tick.
+  addon::QuoteFeed::Instance().Register(InstrumentKey{instrument.productId, hv::Widen(instrument.instrumentCode)}, {},
+                                        platform::TickCount());
 }
 
 void CNewPriceAlertAdv::SendPriceInfoRequest() {
@@ -615,19 +607,18 @@ void CNewPriceAlertAdv::ApplyQuote(const FieldUpdate& update) {
 
 void CNewPriceAlertAdv::FlushSubscriptions() {
   if (!m_current) return;
+  auto& feed = addon::QuoteFeed::Instance();
   const InstrumentKey key{m_current->productId, hv::Widen(m_current->instrumentCode)};
-  for (const InstrumentKey& k : QuoteStore::Instance().TakePending(std::set<InstrumentKey>{key}))
-    addon::SendInterestBatches(Sender(), addon::FieldTarget{k.ProductID, hv::Narrow(k.InstrumentCode)},
+  for (const auto& pending : feed.TakePending(std::set<InstrumentKey>{key}))
+    addon::SendInterestBatches(Sender(), addon::FieldTarget{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)},
                                addon::AlertInterest());
-  QuoteStore::Instance().ExpireMarks(platform::TickCount());
+  feed.ExpireMarks(platform::TickCount());
 }
 
 std::uint64_t CNewPriceAlertAdv::QuoteRecordVersion() const {
   if (!m_current) return 0;
-  QuoteRecord record;
-  if (!QuoteStore::Instance().Peek(InstrumentKey{m_current->productId, hv::Widen(m_current->instrumentCode)}, record))
-    return 0;
-  return record.version;
+  return addon::QuoteFeed::Instance().NewestStamp(
+      std::vector<InstrumentKey>{InstrumentKey{m_current->productId, hv::Widen(m_current->instrumentCode)}});
 }
 
 void CNewPriceAlertAdv::OnTimer(UINT id) {
@@ -763,13 +754,8 @@ void CNewPriceAlertAdv::DrawInfoPanel(QPainter& p, const QRect& area) {
   QuoteRecord quote;
   const bool known =
       m_current &&
-      QuoteStore::Instance().Peek(InstrumentKey{m_current->productId, hv::Widen(m_current->instrumentCode)}, quote);
-  if (m_current && !known) {
-    // Reading queues the instrument for the next tick's subscription.
-    quote = QuoteStore::Instance().Get(InstrumentKey{m_current->productId, hv::Widen(m_current->instrumentCode)},
-                                       platform::TickCount());
-  }
-  auto value = [&](QuoteLayout::Field f) { return m_current ? Q(quote[f].text) : QString(); };
+      addon::QuoteFeed::Instance().Read(InstrumentKey{m_current->productId, hv::Widen(m_current->instrumentCode)}, quote);
+  auto value = [&](QuoteLayout::Field f) { return known ? Q(quote[f].text) : QString(); };
   const int third = area.width() / 3;
   auto cell = [&](int column, int line, const QString& caption, const QString& v) {
     const QRect c(area.left() + pad + column * third, area.top() + pad + line * lineH, captionWidth, lineH);
@@ -783,7 +769,7 @@ void CNewPriceAlertAdv::DrawInfoPanel(QPainter& p, const QRect& area) {
   cell(1, 1, QStringLiteral("Ask"), value(QuoteLayout::Ask));
   cell(2, 1, QStringLiteral("Last"), value(QuoteLayout::Last));
   QString change = value(QuoteLayout::Change);
-  if (m_current && !quote[QuoteLayout::PChange].text.empty())
+  if (known && !quote[QuoteLayout::PChange].text.empty())
     change += QStringLiteral(" (") + Q(quote[QuoteLayout::PChange].text) + QStringLiteral("%)");
   cell(0, 2, QStringLiteral("Change"), change);
   cell(1, 2, QStringLiteral("Open"), value(QuoteLayout::Open));

@@ -55,7 +55,6 @@ class CNewPriceAlertAdv : public CAddonView {
   static constexpr int kCompactHeight = 350;
   static constexpr int kTallHeight = 430;
   static constexpr int kListItems = 17;
-  static constexpr const wchar_t* kNotViewableText = L"Counter is not Viewable.";
   static constexpr const wchar_t* kExplorerImage = L".\\images\\Toolbar\\[styleID]\\InstrumentExplorer.bmp";
 
   CNewPriceAlertAdv();

@@ -4,6 +4,7 @@
 #include <set>
 
 #include "addon/Channel.h"
+#include "addon/Feeds.h"
 #include "addon/TextTables.h"
 #include "data/MarketDelayCache.h"
 #include "data/QuoteStore.h"
@@ -155,25 +156,11 @@ std::uint32_t CPriceAlertList::OnViewMessage(UINT message, LPARAM data) {
     case hm::RequestField:
       if (data) ApplyQuote(message, *FromLParam<const FieldUpdate>(data));
       return 0;
-    case hm::InstrumentList: {
-      const auto* msg = FromLParam<const JInstrumentListMsg>(data);
-      InstrumentMgr_ReadOnly().Fill(msg->instruments);
+    case hm::InstrumentList:  // the base filed the lists; names and delays may be new
+    case hm::ProductList:
+    case hm::MarketInfo:
       if (m_grid) m_grid->Redraw();
       return 0;
-    }
-    case hm::ProductList: {
-      const auto* msg = FromLParam<const JProductListMsg>(data);
-      if (msg->products) ProductMgr().Fill(*msg->products);
-      if (m_grid) m_grid->Redraw();
-      return 0;
-    }
-    case hm::MarketInfo: {
-      const auto& list = *FromLParam<const std::vector<JMarketInfo>>(data);
-      if (!list.empty())
-        MarketDelayCache::Instance().SetDelay(list.front().productId, hv::Widen(list.front().exchangeCode),
-                                              list.front().delay);
-      return 0;
-    }
     case hm::Alert701:
       if (data && IsFirstAlertList()) ReplaceList(*FromLParam<const std::vector<PriceAlertItem>>(data));
       return 0;
@@ -240,8 +227,9 @@ void CPriceAlertList::Rebuild() {
     if (alerts::PassesFilter(a.status, option)) rows.push_back(a);
   m_shownVersion = alerts::Store().Version();
   m_grid->SetRows(std::move(rows));
-  // The current values: instruments new to the quote store are subscribed on the next tick.
-  for (const InstrumentKey& key : m_grid->InstrumentKeys()) QuoteStore::Instance().Get(key, platform::TickCount());
+  // The current values, subscribed on the next tick.
+  for (const InstrumentKey& key : m_grid->InstrumentKeys())
+    addon::QuoteFeed::Instance().Register(key, {}, platform::TickCount());
   UpdateButtons();
 }
 
@@ -314,11 +302,12 @@ void CPriceAlertList::FlushSubscriptions() {
   if (!m_grid) return;
   const std::set<InstrumentKey> shown = m_grid->InstrumentKeys();
   if (shown.empty()) return;
-  for (const InstrumentKey& key : QuoteStore::Instance().TakePending(shown)) {
-    const addon::FieldTarget target{key.ProductID, hv::Narrow(key.InstrumentCode)};
+  auto& feed = addon::QuoteFeed::Instance();
+  for (const auto& pending : feed.TakePending(shown)) {
+    const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
     addon::SendInterestBatches(Sender(), target, addon::AlertInterest());
   }
-  QuoteStore::Instance().ExpireMarks(platform::TickCount());
+  feed.ExpireMarks(platform::TickCount());
 }
 
 void CPriceAlertList::OnTimer(UINT id) {
