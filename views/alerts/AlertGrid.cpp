@@ -338,7 +338,8 @@ void AlertGrid::FillDataCell(int position, const PriceAlertItem& alert, CGridCel
       const int field = alerts::FieldIndex(alert.priceField);
       const QuoteLayout::Field f = field == 0 ? QuoteLayout::Ask : field == 1 ? QuoteLayout::Bid : QuoteLayout::Last;
       QuoteCell value;
-      if (addon::QuoteFeed::Instance().ReadCell(KeyOf(alert), f, value)) cell.SetText(value.text);
+      // Nothing until the terminal has sent a value.
+      if (addon::QuoteFeed::Instance().ReadCell(KeyOf(alert), f, value) && value.filled) cell.SetText(value.text);
       cell.SetAlignment(Qt::AlignRight | Qt::AlignVCenter);
       return;
     }

@@ -79,7 +79,10 @@ void AlertSettingsCache::Set(const std::string& key, const std::wstring& value) 
 }
 
 int MaxValidityDays() {
-  const std::wstring text = AlertSettingsCache::Instance().Get(kMaxValidityKey);
+  std::wstring text = AlertSettingsCache::Instance().Get(kMaxValidityKey);
+  // Blanks around the number are allowed, as for the other parameters.
+  while (!text.empty() && (text.back() == L' ' || text.back() == L'\t')) text.pop_back();
+  while (!text.empty() && (text.front() == L' ' || text.front() == L'\t')) text.erase(text.begin());
   if (text.empty()) return kDefaultValidityDays;
   long days = 0;
   for (wchar_t c : text) {

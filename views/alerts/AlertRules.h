@@ -95,7 +95,8 @@ inline constexpr const char* kSmsKey = "ALSMS";
 inline constexpr const char* kExchangesKey = "EXCPA";
 inline constexpr int kDefaultValidityDays = 15;
 
-// Days of validity offered: "MAXPA" as a whole positive number, else 15.
+// Days of validity offered: "MAXPA" as a whole positive number (blanks
+// around it allowed), else 15.
 int MaxValidityDays();
 // Whether "ALEML" or "ALSMS" offers the channel: the answer is exactly "1".
 bool ChannelOffered(const char* key);

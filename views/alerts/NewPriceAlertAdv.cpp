@@ -755,7 +755,8 @@ void CNewPriceAlertAdv::DrawInfoPanel(QPainter& p, const QRect& area) {
   const bool known =
       m_current &&
       addon::QuoteFeed::Instance().Read(InstrumentKey{m_current->productId, hv::Widen(m_current->instrumentCode)}, quote);
-  auto value = [&](QuoteLayout::Field f) { return known ? Q(quote[f].text) : QString(); };
+  // Nothing until the terminal has sent a value.
+  auto value = [&](QuoteLayout::Field f) { return known && quote[f].filled ? Q(quote[f].text) : QString(); };
   const int third = area.width() / 3;
   auto cell = [&](int column, int line, const QString& caption, const QString& v) {
     const QRect c(area.left() + pad + column * third, area.top() + pad + line * lineH, captionWidth, lineH);
@@ -769,7 +770,7 @@ void CNewPriceAlertAdv::DrawInfoPanel(QPainter& p, const QRect& area) {
   cell(1, 1, QStringLiteral("Ask"), value(QuoteLayout::Ask));
   cell(2, 1, QStringLiteral("Last"), value(QuoteLayout::Last));
   QString change = value(QuoteLayout::Change);
-  if (known && !quote[QuoteLayout::PChange].text.empty())
+  if (known && quote[QuoteLayout::PChange].filled && !quote[QuoteLayout::PChange].text.empty())
     change += QStringLiteral(" (") + Q(quote[QuoteLayout::PChange].text) + QStringLiteral("%)");
   cell(0, 2, QStringLiteral("Change"), change);
   cell(1, 2, QStringLiteral("Open"), value(QuoteLayout::Open));
