@@ -51,6 +51,31 @@ CREATE TABLE layout_state (
 );
 )sql";
 
+// The steps from one format to the next: step k turns format k - 1 into k.
+// Each runs in the transaction that also sets the new format number, so a
+// database is either wholly at one format or at the next.
+struct Migration {
+  int to;
+  const char* sql;
+};
+const Migration kMigrations[] = {
+    // 2: every firing of a price alert with its notice, kept with the alert.
+    {2, R"sql(
+CREATE TABLE alert_firings (
+  seq         INTEGER PRIMARY KEY AUTOINCREMENT,
+  alert_id    INTEGER NOT NULL,
+  fired_at    TEXT NOT NULL,
+  price_field TEXT NOT NULL,
+  comparator  TEXT NOT NULL,
+  threshold   REAL NOT NULL,
+  value       REAL NOT NULL,
+  value_text  TEXT NOT NULL,
+  notice      TEXT NOT NULL
+);
+CREATE INDEX alert_firings_by_alert ON alert_firings(alert_id, seq);
+)sql"},
+};
+
 // RAII prepared statement. Connections close with sqlite3_close_v2, which
 // waits for statements still alive instead of leaking the connection.
 class Stmt {
@@ -59,6 +84,7 @@ class Stmt {
   ~Stmt() { sqlite3_finalize(m_stmt); }
   bool ok() const { return m_rc == SQLITE_OK && m_stmt; }
   Stmt& Bind(int i, std::int64_t v) { sqlite3_bind_int64(m_stmt, i, v); return *this; }
+  Stmt& BindReal(int i, double v) { sqlite3_bind_double(m_stmt, i, v); return *this; }
   Stmt& Bind(int i, const std::string& v) {
     sqlite3_bind_text(m_stmt, i, v.data(), static_cast<int>(v.size()), SQLITE_TRANSIENT);
     return *this;
@@ -76,6 +102,7 @@ class Stmt {
     return rc == SQLITE_DONE;
   }
   std::int64_t Int(int col) const { return sqlite3_column_int64(m_stmt, col); }
+  double Real(int col) const { return sqlite3_column_double(m_stmt, col); }
   std::string Text(int col) const {
     const void* p = sqlite3_column_blob(m_stmt, col);
     const int n = sqlite3_column_bytes(m_stmt, col);
@@ -249,18 +276,44 @@ std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report,
     return nullptr;
   }
   if (report.outcome != StoreOpenReport::Outcome::Opened) {
+    // A new database starts at format 1 and takes the same steps as an old one.
     Transaction tx(*store);
     if (!tx.open() || !store->Exec(kSchema) ||
         !store->Exec(("PRAGMA application_id=" + std::to_string(kApplicationId)).c_str()) ||
-        !store->Exec(("PRAGMA user_version=" + std::to_string(kSchemaVersion)).c_str()) || !tx.Commit()) {
+        !store->Exec("PRAGMA user_version=1") || !tx.Commit()) {
       error = "cannot create " + path.string() + ": " + store->m_error;
       return nullptr;
     }
   }
+  if (!store->Migrate(error)) return nullptr;
   return store;
 }
 
 Store::~Store() { sqlite3_close_v2(m_db); }
+
+int Store::UserVersion() {
+  Stmt s(m_db, "PRAGMA user_version");
+  return s.ok() && s.Step() == SQLITE_ROW ? static_cast<int>(s.Int(0)) : -1;
+}
+
+bool Store::Migrate(std::string& error) {
+  const int from = UserVersion();
+  if (from < 1) {
+    error = "cannot read the format of " + m_path.string() + ": " + sqlite3_errmsg(m_db);
+    return false;
+  }
+  for (const Migration& step : kMigrations) {
+    if (step.to <= from) continue;
+    Transaction tx(*this);
+    if (!tx.open() || !Exec(step.sql) || !Exec(("PRAGMA user_version=" + std::to_string(step.to)).c_str()) ||
+        !tx.Commit()) {
+      // The database stays at the last format it reached; nothing is lost.
+      error = "cannot bring " + m_path.string() + " to format " + std::to_string(step.to) + ": " + m_error;
+      return false;
+    }
+  }
+  return true;
+}
 
 bool Store::Exec(const char* sql) {
   char* msg = nullptr;
@@ -369,8 +422,33 @@ bool Store::SaveAlerts(const std::vector<AlertRow>& alerts) {
   if (!ins.ok()) return Fail("save alerts");
   for (const auto& a : alerts)
     if (!ins.Bind(1, a.id).Bind(2, a.body).Run()) return Fail("save alerts");
+  if (!Exec("DELETE FROM alert_firings WHERE alert_id NOT IN (SELECT id FROM alerts)")) return false;
   if (!MarkSaved("alerts")) return Fail("save alerts");
   return tx.Commit();
+}
+
+bool Store::AddAlertFiring(const AlertFiringRow& f) {
+  Transaction tx(*this);
+  if (!tx.open()) return false;
+  Stmt ins(m_db,
+           "INSERT INTO alert_firings(alert_id, fired_at, price_field, comparator, threshold, value, value_text, notice) "
+           "VALUES(?, ?, ?, ?, ?, ?, ?, ?)");
+  if (!ins.ok() || !ins.Bind(1, f.alertId).Bind(2, f.firedAt).Bind(3, f.priceField).Bind(4, f.comparator)
+                        .BindReal(5, f.threshold).BindReal(6, f.value).Bind(7, f.valueText).Bind(8, f.notice).Run())
+    return Fail("save an alert firing");
+  return tx.Commit();
+}
+
+std::vector<AlertFiringRow> Store::LoadAlertFirings(std::int64_t alertId) {
+  std::vector<AlertFiringRow> out;
+  Stmt s(m_db,
+         "SELECT alert_id, fired_at, price_field, comparator, threshold, value, value_text, notice FROM alert_firings "
+         "WHERE alert_id = ? ORDER BY seq");
+  if (!s.ok()) { Fail("load alert firings"); return out; }
+  s.Bind(1, alertId);
+  while (s.Step() == SQLITE_ROW)
+    out.push_back({s.Int(0), s.Text(1), s.Text(2), s.Text(3), s.Real(4), s.Real(5), s.Text(6), s.Text(7)});
+  return out;
 }
 
 SavedLayout Store::LoadLayout() {

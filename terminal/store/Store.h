@@ -47,6 +47,19 @@ struct AlertRow {
   std::string body;
 };
 
+// One firing of a price alert, kept with the alert (the notice the terminal
+// showed, and the price and time that met the condition).
+struct AlertFiringRow {
+  std::int64_t alertId = 0;
+  std::string firedAt;     // "YYYY-MM-DD HH:MM:SS"
+  std::string priceField;
+  std::string comparator;
+  double threshold = 0.0;
+  double value = 0.0;
+  std::string valueText;
+  std::string notice;
+};
+
 // One open view of the saved layout, in opening order.
 struct SavedView {
   std::string className;
@@ -66,7 +79,8 @@ struct SavedLayout {
 
 class Store {
  public:
-  static constexpr int kSchemaVersion = 1;
+  // Format 1 is the first; each later format is one step of Migrate().
+  static constexpr int kSchemaVersion = 2;
   static constexpr const char* kFileName = "terminal.db";
 
   // $XDG_DATA_HOME/marketviews-terminal, or ~/.local/share/marketviews-terminal.
@@ -101,9 +115,13 @@ class Store {
   bool HasSavedWatchlists(std::int32_t kind);
   bool HasSavedAlerts();
 
-  // Alerts in id order. Save replaces them all.
+  // Alerts in id order. Save replaces them all; the firings of alerts that
+  // are no longer there go with them.
   std::vector<AlertRow> LoadAlerts();
   bool SaveAlerts(const std::vector<AlertRow>& alerts);
+  // Appends one firing to an alert's history; its firings oldest first.
+  bool AddAlertFiring(const AlertFiringRow& firing);
+  std::vector<AlertFiringRow> LoadAlertFirings(std::int64_t alertId);
 
   SavedLayout LoadLayout();
   bool SaveLayout(const SavedLayout& layout);
@@ -111,6 +129,9 @@ class Store {
  private:
   explicit Store(sqlite3* db, std::filesystem::path path) : m_db(db), m_path(std::move(path)) {}
   bool Exec(const char* sql);
+  // Brings a database of an older format up to kSchemaVersion, keeping its data.
+  bool Migrate(std::string& error);
+  int UserVersion();
   bool Fail(const char* what);
   bool MarkSaved(const std::string& set);
   bool HasSaved(const std::string& set);
