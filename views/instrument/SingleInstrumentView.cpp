@@ -36,6 +36,20 @@ CSingleInstrumentView::CSingleInstrumentView(const addon::ViewClassInfo& info) :
 
 CSingleInstrumentView::~CSingleInstrumentView() = default;
 
+addon::ViewClassInfo CSingleInstrumentView::InstrumentClassInfo(const char* className,
+                                                                const CRuntimeClass* descriptor, int titleEntry,
+                                                                const wchar_t* defaultTitle, const char* refusalKey) {
+  return addon::ViewClassInfo{
+      .className = className,
+      .titleEntry = titleEntry,
+      .defaultTitle = defaultTitle,
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .refusalKey = refusalKey,
+      .dropSources = addon::kInstrumentViewSources,
+      .descriptor = descriptor,
+  };
+}
+
 bool CSingleInstrumentView::IsCurrentRegistration() const {
   if (!m_user.IsMember()) return false;
   for (CSuperBaseView* view : addon::UserViews().Views())
