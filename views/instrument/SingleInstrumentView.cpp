@@ -1,6 +1,5 @@
 #include "views/instrument/SingleInstrumentView.h"
 
-#include <QKeyEvent>
 #include <QLineEdit>
 #include <QPainter>
 #include <algorithm>
@@ -21,14 +20,6 @@ namespace {
 constexpr int kSecondButtonId = 2016;
 constexpr int kButtonSize = 18;
 constexpr COLORREF kButtonBack = MakeColorRef(0xCC, 0xCC, 0xCC);
-
-std::wstring ReplaceStyleId(std::wstring path, int styleId) {
-  static const std::wstring kPlaceholder = L"[styleID]";
-  const std::wstring id = std::to_wstring(styleId);
-  for (std::size_t at = path.find(kPlaceholder); at != std::wstring::npos; at = path.find(kPlaceholder, at + id.size()))
-    path.replace(at, kPlaceholder.size(), id);
-  return path;
-}
 
 }  // namespace
 
@@ -131,7 +122,7 @@ void CSingleInstrumentView::OnComboChosen() {
 }
 
 void CSingleInstrumentView::ReloadImages() {
-  const std::wstring path = ReplaceStyleId(kExplorerImage, m_styleId);
+  const std::wstring path = StyleImagePath(kExplorerImage);
   if (m_explorer) m_explorer->LoadBitmap(path);
 }
 

@@ -39,6 +39,7 @@ class CTestView : public CAddonView {
 };
 
 struct AddonViewTest : ::testing::Test {
+  void SetUp() override { CAddonView::ResetProcessState(); }
   mvtest::ScriptedHost host;
   CTestView* Make() { return static_cast<CTestView*>(host.Adopt(new CTestView)); }
 };
