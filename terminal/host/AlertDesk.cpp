@@ -198,18 +198,4 @@ std::string AlertDesk::NoticeText(const PriceAlertItem& alert, const std::string
          " " + valueText + " met the condition " + comparator + " " + thresholdText + " at " + firedAt + ".";
 }
 
-// ---- The in-memory store's alert history ----------------------------------------
-
-void MemoryHostStore::SaveAlertFiring(const AlertFiring& firing) {
-  firings.push_back(firing);
-  ++saveCount;
-}
-
-std::vector<AlertFiring> MemoryHostStore::LoadAlertFirings(std::int32_t alertId) {
-  std::vector<AlertFiring> out;
-  for (const AlertFiring& f : firings)
-    if (f.alertId == alertId) out.push_back(f);
-  return out;
-}
-
 }  // namespace term

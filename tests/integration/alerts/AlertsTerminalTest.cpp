@@ -68,12 +68,6 @@ QStringList AlertLine(const QString& tsv, const QString& code) {
   return {};
 }
 
-CSuperBaseView* ViewOf(term::TerminalApp& app, const char* className) {
-  for (CSuperBaseView* v : app.Runtime().Views())
-    if (app.Runtime().ClassNameOf(v) == className) return v;
-  return nullptr;
-}
-
 // The busiest share of SGX the user may see and trade.
 int BusyShare(sim::Market& market) {
   int best = -1, trades = -1;
