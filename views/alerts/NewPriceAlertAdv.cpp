@@ -10,7 +10,6 @@
 #include "addon/Channel.h"
 #include "addon/LinkText.h"
 #include "addon/TextTables.h"
-#include "controls/CellTypes.h"
 #include "controls/InstrumentComboBox.h"
 #include "addon/Feeds.h"
 #include "data/QuoteStore.h"
@@ -256,7 +255,7 @@ void CNewPriceAlertAdv::FillList(CSkinComboBox* list, int firstText, const std::
 
 void CNewPriceAlertAdv::ChangeStyle(int styleId) {
   CAddonView::ChangeStyle(styleId);
-  if (m_explorer) m_explorer->LoadBitmap(CStyleImage::ForStyle(kExplorerImage, styleId));
+  if (m_explorer) m_explorer->LoadBitmap(StyleImagePath(kExplorerImage));
   SetStyleManager(m_pStyleManager);
 }
 
@@ -271,7 +270,7 @@ void CNewPriceAlertAdv::SetStyleManager(IStyleManager* styleManager) {
   if (m_notice) m_notice->SetStyleManager(styleManager);
   for (CHostButton* b : std::initializer_list<CHostButton*>{m_explorer, m_submit, m_app, m_email, m_sms})
     if (b) b->SetStyleManager(styleManager);
-  if (m_explorer) m_explorer->LoadBitmap(CStyleImage::ForStyle(kExplorerImage, m_styleId));
+  if (m_explorer) m_explorer->LoadBitmap(StyleImagePath(kExplorerImage));
   update();
 }
 

@@ -71,6 +71,7 @@ struct AlertFixture : ::testing::Test {
   std::vector<TickBand> bands{{0, 0.0, 10.0, 0.01}, {0, 10.0, 50.0, 0.05}, {0, 50.0, 1000.0, 0.1}};
 
   void SetUp() override {
+    CAddonView::ResetProcessState();
     alerts::AlertSettingsCache::Instance().Clear();
     alerts::Store().Fill(std::vector<PriceAlertItem>{});
     alerts::SetTodayForTests([] { return kToday; });

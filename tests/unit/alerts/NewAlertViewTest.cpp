@@ -111,6 +111,28 @@ TEST_F(NewAlertForm, Notice_FrameGrowsOnceAndShrinksOnceTheLastChannelIsCleared)
   EXPECT_TRUE(FrameSizes(host).empty());
 }
 
+TEST_F(NewAlertForm, Settings_TheFirstFormAsksThemOnceAndFilesEachUnderItsKey) {
+  host.AnswerSetting(hm::SystemParameter, "ALEML", "1");
+  host.AnswerSetting(hm::SystemParameter, "MAXPA", "30");
+  CNewPriceAlertAdv* form = MakeForm();
+  std::vector<std::string> asked;
+  for (const auto& f : host.RequestsOf(hm::SystemParameter)) asked.push_back(f.text);
+  EXPECT_EQ(asked, (std::vector<std::string>{"ALEML", "ALSMS", "MAXPA"}));
+  auto& cache = alerts::AlertSettingsCache::Instance();
+  EXPECT_EQ(cache.Get("ALEML"), L"1");
+  EXPECT_EQ(cache.Get("ALSMS"), L"") << "not answered";
+  EXPECT_EQ(cache.Get("MAXPA"), L"30");
+  EXPECT_TRUE(form->ChannelBox(CNewPriceAlertAdv::kEmailId)->isVisible());
+  EXPECT_FALSE(form->ChannelBox(CNewPriceAlertAdv::kSmsId)->isVisible());
+  QDate first, last;
+  form->DateControl()->GetRange(first, last);
+  EXPECT_EQ(last, kToday.addDays(30));
+  EXPECT_EQ(form->DateControl()->GetTime(), last);
+  host.ClearRequests();
+  MakeForm();
+  EXPECT_TRUE(host.RequestsOf(hm::SystemParameter).empty()) << "once per process";
+}
+
 TEST_F(NewAlertForm, Channels_EmailAndSmsShowOnlyForAnswersOfExactlyOne) {
   struct Case {
     const char* answer;
