@@ -686,9 +686,12 @@ void CNewPriceAlertAdv::Relayout() {
   if (m_email) m_email->setGeometry(kControlLeft + 176, y, 80, kRowHeight);
   if (m_sms) m_sms->setGeometry(kControlLeft + 262, y, 70, kRowHeight);
   y += kRowStep;
-  if (m_notice) m_notice->setGeometry(kControlLeft, y, right - kControlLeft, kNoticeHeight);
-  const int bottom = std::max(y + (m_noticeShown ? kNoticeHeight + 10 : 4), height() - kRowHeight - 10);
-  if (m_submit) m_submit->setGeometry(right - 96, bottom, 96, kRowHeight);
+  // A frame shorter than asked for takes from the notice first, so that the
+  // submit button, right under the last row in use, stays in view.
+  const int noticeHeight = std::clamp(height() - y - kRowHeight - 14, 36, kNoticeHeight);
+  if (m_notice) m_notice->setGeometry(kControlLeft, y, right - kControlLeft, noticeHeight);
+  const int submitTop = y + (m_noticeShown ? noticeHeight + 10 : 4);
+  if (m_submit) m_submit->setGeometry(right - 96, submitTop, 96, kRowHeight);
   update();
 }
 
