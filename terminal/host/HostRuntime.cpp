@@ -16,6 +16,7 @@
 #include "hostview/Text.h"
 #include "platform/Platform.h"
 #include "terminal/host/Services.h"
+#include "terminal/host/TradePages.h"
 #include "terminal/host/WatchlistXml.h"
 #include "terminal/sim/Market.h"
 
@@ -492,8 +493,10 @@ void HostRuntime::Impl::CollectPushes(std::vector<std::pair<CSuperBaseView*, Fie
         }
         continue;
       }
-      std::string value = market->FieldValue(idx, s.field, s.param, s.kind);
       if (s.last.empty()) s.last.resize(1);
+      // Full history pages of the tape never change: not formatted again.
+      if (s.kind == 2 && !tape::MayHaveMoved(s.field, s.param, int(market->Trades(idx).size()), s.last[0])) continue;
+      std::string value = market->FieldValue(idx, s.field, s.param, s.kind);
       if (value == s.last[0]) continue;
       s.last[0] = value;
       out.emplace_back(s.view, FieldUpdate{s.productId, s.code, s.field, std::move(value), s.param, s.kind});
