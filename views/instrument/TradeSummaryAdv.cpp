@@ -4,15 +4,19 @@ ADDON_IMPLEMENT_VIEW(CTradeSummaryAdv)
 
 const addon::ViewClassInfo& CTradeSummaryAdv::Info() {
   static const addon::ViewClassInfo info{
-      "CTradeSummaryAdv",
-      "TradeSummaryAdv.cpp",
-      10,
-      L"Trade Summary",
-      {},
-      {addon::RefStore::Products, addon::RefStore::Instruments},
+      .className = "CTradeSummaryAdv",
+      .titleEntry = 10,
+      .defaultTitle = L"Trade Summary",
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .refusalKey = "17003",
+      .dropSources = addon::kInstrumentViewSources,
+      .descriptor = &classCTradeSummaryAdv,
   };
   return info;
 }
 
 CTradeSummaryAdv::CTradeSummaryAdv() : CSingleInstrumentView(Info()) {}
 CTradeSummaryAdv::~CTradeSummaryAdv() = default;
+
+void CTradeSummaryAdv::OnActivate() { ActivateInstrumentView(); }
+void CTradeSummaryAdv::OnDeactivate() { DeactivateInstrumentView(); }
