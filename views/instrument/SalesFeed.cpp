@@ -1,69 +1,37 @@
 #include "views/instrument/SalesFeed.h"
 
-#include <algorithm>
-#include <utility>
-
+#include "addon/Channel.h"
 #include "hostview/Text.h"
 #include "views/instrument/SalesPaging.h"
 
 namespace sales {
-namespace {
-
-std::vector<InstrumentKey>& HeaderQueue() {
-  static std::vector<InstrumentKey> queue;
-  return queue;
-}
-std::vector<PageKey>& PageQueue() {
-  static std::vector<PageKey> queue;
-  return queue;
-}
-
-// Creates the record when absent; the store's own pending list is not how
-// these are requested, so what Get queued is taken back.
-template <class Store>
-void EnsureRecord(Store& store, const typename Store::Key& key, std::uint32_t now) {
-  typename Store::Record probe;
-  if (store.Peek(key, probe)) return;
-  store.Get(key, now);
-  struct One {
-    const typename Store::Key* key;
-    std::size_t count(const typename Store::Key& k) const { return k == *key ? 1 : 0; }
-  };
-  store.TakePending(One{&key});
-}
-
-template <class K>
-void Enqueue(std::vector<K>& queue, K key) {
-  if (std::find(queue.begin(), queue.end(), key) == queue.end()) queue.push_back(std::move(key));
-}
-
-}  // namespace
 
 void RegisterHeader(const InstrumentKey& key, std::uint32_t now) {
-  if (key.InstrumentCode.empty()) return;
-  EnsureRecord(SalesSummaryStore::Instance(), key, now);
-  Enqueue(HeaderQueue(), key);
+  SalesHeaderFeed::Instance().Register(key, addon::NoParams{}, now);
 }
 
 void RegisterPage(const InstrumentKey& key, std::int32_t page, std::uint32_t now) {
-  if (key.InstrumentCode.empty() || !IsPage(page)) return;
-  PageKey k{key.ProductID, key.InstrumentCode, page};
-  EnsureRecord(SalesPageStore::Instance(), k, now);
-  Enqueue(PageQueue(), std::move(k));
+  if (!IsPage(page)) return;
+  SalesPageFeed::Instance().Register(key, page, now);
 }
 
-std::vector<InstrumentKey> TakePendingHeaders() { return std::exchange(HeaderQueue(), {}); }
-std::vector<PageKey> TakePendingPages() { return std::exchange(PageQueue(), {}); }
-std::size_t PendingCount() { return HeaderQueue().size() + PageQueue().size(); }
+void SendPending(const addon::FeedbackSender& send) {
+  for (const auto& pending : SalesHeaderFeed::Instance().TakePending()) {
+    const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
+    addon::SendRequestBatch(send, target, addon::fields::kSalesHeader, addon::BatchTag{kKind, kHeaderParam});
+  }
+  for (const auto& pending : SalesPageFeed::Instance().TakePending()) {
+    const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
+    addon::SendRequestBatch(send, target, {"TRADEDATA"}, addon::BatchTag{kKind, pending.params});
+  }
+}
 
 void ClearPending() {
-  HeaderQueue().clear();
-  PageQueue().clear();
+  SalesHeaderFeed::Instance().Reset();
+  SalesPageFeed::Instance().Reset();
 }
 
-bool ReadHeader(const InstrumentKey& key, SalesSummaryRecord& out) {
-  return SalesSummaryStore::Instance().Peek(key, out);
-}
+bool ReadHeader(const InstrumentKey& key, SalesSummaryRecord& out) { return SalesHeaderFeed::Instance().Read(key, out); }
 
 Applied ApplyUpdate(const FieldUpdate& u, std::uint32_t now) {
   if (u.kind != kKind) return Applied::Ignored;

@@ -6,18 +6,19 @@
 //   SalesPageStore     the raw "TRADEDATA" text of a page (1..999, 99998 live);
 //   TradeTape          every trade parsed from the pages, by number.
 //
-// A registration makes sure the record exists (an answer for a key without a
-// record would be dropped) and queues the key for the next refresh tick of
-// the view that sends requests, even when the record existed already: a
-// header or page asked again (a successor view, a new batch) is requested
-// again. The same key queued twice before it is taken leaves once. Reading
-// never creates or queues anything.
+// Two store feeds (addon/StoreFeed.h) carry what the views want:
+//   SalesHeaderFeed  SalesSummaryStore; no params; the instrument's header;
+//   SalesPageFeed    SalesPageStore; params: the page; that page's record.
+// The current view of the class sends the requests of both feeds (header
+// batch with 99999, one page request per page).
 //
 // UI thread only (the stores take their own locks).
 #include <cstdint>
 #include <string>
 #include <vector>
 
+#include "addon/Channel.h"
+#include "addon/StoreFeed.h"
 #include "data/Keys.h"
 #include "data/MarketStores.h"
 #include "data/TradeTape.h"
@@ -34,14 +35,31 @@ inline constexpr int kMaxHistoryPage = 999;
 constexpr bool IsPage(std::int32_t param) { return (param >= 1 && param <= kMaxHistoryPage) || param == kLivePage; }
 constexpr bool IsHeader(std::int32_t param) { return param == 0 || param == kHeaderParam; }
 
+struct HeaderFeedTraits {
+  using Store = SalesSummaryStore;
+  using Params = addon::NoParams;
+  static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, addon::NoParams) { return {key}; }
+};
+using SalesHeaderFeed = addon::StoreFeed<HeaderFeedTraits>;
+
+struct PageFeedTraits {
+  using Store = SalesPageStore;
+  using Params = std::int32_t;  // the page: 1..999 or 99998
+  static std::vector<PageKey> RecordKeys(const InstrumentKey& key, std::int32_t page) {
+    if (!IsPage(page)) return {};
+    return {PageKey{key.ProductID, key.InstrumentCode, page}};
+  }
+};
+using SalesPageFeed = addon::StoreFeed<PageFeedTraits>;
+
+// Registers in the feeds above; a page that is neither a history page nor the
+// live page is ignored.
 void RegisterHeader(const InstrumentKey& key, std::uint32_t now);
 void RegisterPage(const InstrumentKey& key, std::int32_t page, std::uint32_t now);
-
-// The queued keys in the order registered; the queue is emptied.
-std::vector<InstrumentKey> TakePendingHeaders();
-std::vector<PageKey> TakePendingPages();
-std::size_t PendingCount();  // headers and pages
-// Drops every queued key (tests).
+// Sends the requests of everything queued in both feeds (headers first); the
+// queues empty.
+void SendPending(const addon::FeedbackSender& send);
+// Drops every queued interest (tests).
 void ClearPending();
 
 // The header of `key` as last stored; false when it has no record.

@@ -226,13 +226,32 @@ TEST_F(PagingTest, FeedRegistersPagesOnceAndAnswersLandInTheStoresAndTheBatch) {
   sales::RegisterPage(kKey, sales::kLivePage, now);
   sales::RegisterPage(kKey, 1000, now);  // neither a history page nor the live page
   sales::RegisterPage(kKey, 2, now);
-  EXPECT_EQ(sales::TakePendingHeaders(), (std::vector<InstrumentKey>{kKey}));
-  EXPECT_EQ(sales::TakePendingPages(),
-            (std::vector<PageKey>{{7, L"D05", sales::kLivePage}, {7, L"D05", 2}}));
+  // One header batch and one request per page, in the order registered.
+  std::vector<FieldRequest> requests;
+  sales::SendPending([&](UINT message, LPARAM data) {
+    EXPECT_EQ(message, hm::RequestField);
+    requests.push_back(*FromLParam<const FieldRequest>(data));
+  });
+  ASSERT_EQ(requests.size(), 9u + 2u + 2u);
+  const std::vector<std::string> headerFields = {"DTIME", "HIGH", "LOW", "NETCHANGE", "LAST", "TOTALVALUE", "TOTAL_VOLUME",
+                                           "PAGECOUNT", "PMP_Submit"};
+  for (std::size_t k = 0; k < headerFields.size(); ++k) {
+    EXPECT_EQ(requests[k].fieldName, headerFields[k]);
+    EXPECT_EQ(requests[k].param, 99999);
+    EXPECT_EQ(requests[k].kind, 2);
+  }
+  EXPECT_EQ(requests[9].fieldName, "TRADEDATA");
+  EXPECT_EQ(requests[9].param, sales::kLivePage);
+  EXPECT_EQ(requests[10].fieldName, "PMP_Submit");
+  EXPECT_EQ(requests[10].param, sales::kLivePage);
+  EXPECT_EQ(requests[11].fieldName, "TRADEDATA");
+  EXPECT_EQ(requests[11].param, 2);
+  EXPECT_EQ(requests[12].productId, 7);
+  EXPECT_EQ(requests[12].instrumentCode, "D05");
   EXPECT_EQ(SalesPageStore::Instance().PendingCount(), 0u) << "the store's own list is not how pages leave";
   // Asked again after it was taken: queued again.
   sales::RegisterPage(kKey, 2, now);
-  EXPECT_EQ(sales::PendingCount(), 1u);
+  EXPECT_EQ(sales::SalesPageFeed::Instance().PendingCount(), 1u);
 
   sales::PageBatches::Instance().Start(kKey, 1, 2, now);
   FieldUpdate u{7, "D05", "TRADEDATA", "10:00:01|1.0|5|1||101;10:00:00|1.0|5|2||100", 2, 2};

@@ -91,8 +91,10 @@ struct TimeASGridTest : ::testing::Test {
 };
 
 TEST_F(TimeASGridTest, LivePageStartingAt250GivesTheRowsNewestFirst) {
-  EXPECT_EQ(sales::TakePendingPages(), (std::vector<PageKey>{{7, key.InstrumentCode, sales::kLivePage}}))
-      << "the live page is asked for on selection";
+  const auto pending = sales::SalesPageFeed::Instance().TakePending();
+  ASSERT_EQ(pending.size(), 1u) << "the live page is asked for on selection";
+  EXPECT_EQ(pending[0].key, key);
+  EXPECT_EQ(pending[0].params, sales::kLivePage);
   EXPECT_EQ(grid->CurrentPage(), sales::kLivePage);
   Live(Page(250, 151));
   grid->NewestStamp();
@@ -216,10 +218,12 @@ TEST_F(TimeASGridTest, PriceClickOpensATicketWithTheSideOfAOrBOnly) {
 }
 
 TEST_F(TimeASGridTest, AHistoryPageStartRegistersTheEarlierPages) {
-  sales::TakePendingPages();
+  sales::ClearPending();
   grid->SetInstrument(key, 4);
   EXPECT_EQ(grid->CurrentPage(), 4);
-  EXPECT_EQ(sales::TakePendingPages(), (std::vector<PageKey>{{7, key.InstrumentCode, 1}, {7, key.InstrumentCode, 2}, {7, key.InstrumentCode, 3}}));
+  std::vector<int> pages;
+  for (const auto& p : sales::SalesPageFeed::Instance().TakePending()) pages.push_back(p.params);
+  EXPECT_EQ(pages, (std::vector<int>{1, 2, 3}));
 }
 
 }  // namespace
