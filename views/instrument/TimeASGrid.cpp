@@ -126,7 +126,7 @@ void TimeASGrid::Recount() {
       lastFilled = i;
       pageStamp = std::max(pageStamp, r->version);
       // The live page starts with the newest trade: its number is the tape's length.
-      if (i == 0) total = mvd::NewestTradeNumber((*r)[SalesPageLayout::TradeData].text);
+      if (i == 0) total = std::min(mvd::NewestTradeNumber((*r)[SalesPageLayout::TradeData].text), kMaxRows);
     }
   });
   // Both stamps only grow, so their sum grows whenever either does.

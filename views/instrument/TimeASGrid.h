@@ -32,6 +32,9 @@ class TimeASGrid : public CInstrumentGrid {
   static const std::array<ColumnDef, kColumnCount>& Columns();
   static constexpr const wchar_t* kColumnMask = L"1111";  // every column, always
   static constexpr int kRowHeight = 21;
+  // Rows at most: far beyond a trading day's tape, and a garbled trade number
+  // cannot make the grid reserve rows by the billion.
+  static constexpr int kMaxRows = 10'000'000;
   // Style colours of the side texts and language entries of their words.
   static constexpr int kBuyColor = 3101;
   static constexpr int kSellColor = 3102;

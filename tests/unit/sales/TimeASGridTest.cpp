@@ -217,6 +217,13 @@ TEST_F(TimeASGridTest, PriceClickOpensATicketWithTheSideOfAOrBOnly) {
   EXPECT_EQ(grid->GridCursor(), Qt::ArrowCursor);
 }
 
+TEST_F(TimeASGridTest, GarbledTradeNumberCannotBlowUpTheRowCount) {
+  Live(Item(2147483647) + ";" + Item(2147483646));
+  grid->NewestStamp();
+  EXPECT_EQ(grid->GetNumberRows(), TimeASGrid::kMaxRows);
+  EXPECT_EQ(Row(0), QStringList({"", "", "", ""}));
+}
+
 TEST_F(TimeASGridTest, AHistoryPageStartRegistersTheEarlierPages) {
   sales::ClearPending();
   grid->SetInstrument(key, 4);
