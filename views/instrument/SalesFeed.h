@@ -6,7 +6,7 @@
 //   SalesPageStore     the raw "TRADEDATA" text of a page (1..999, 99998 live);
 //   TradeTape          every trade parsed from the pages, by number.
 //
-// Two store feeds (addon/StoreFeed.h) carry what the views want:
+// Two store feeds (addon/Feeds.h) carry what the views want:
 //   SalesHeaderFeed  SalesSummaryStore; no params; the instrument's header;
 //   SalesPageFeed    SalesPageStore; params: the page; that page's record.
 // The current view of the class sends the requests of both feeds (header
@@ -18,7 +18,7 @@
 #include <vector>
 
 #include "addon/Channel.h"
-#include "addon/StoreFeed.h"
+#include "addon/Feeds.h"
 #include "data/Keys.h"
 #include "data/MarketStores.h"
 #include "data/TradeTape.h"
@@ -35,22 +35,8 @@ inline constexpr int kMaxHistoryPage = 999;
 constexpr bool IsPage(std::int32_t param) { return (param >= 1 && param <= kMaxHistoryPage) || param == kLivePage; }
 constexpr bool IsHeader(std::int32_t param) { return param == 0 || param == kHeaderParam; }
 
-struct HeaderFeedTraits {
-  using Store = SalesSummaryStore;
-  using Params = addon::NoParams;
-  static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, addon::NoParams) { return {key}; }
-};
-using SalesHeaderFeed = addon::StoreFeed<HeaderFeedTraits>;
-
-struct PageFeedTraits {
-  using Store = SalesPageStore;
-  using Params = std::int32_t;  // the page: 1..999 or 99998
-  static std::vector<PageKey> RecordKeys(const InstrumentKey& key, std::int32_t page) {
-    if (!IsPage(page)) return {};
-    return {PageKey{key.ProductID, key.InstrumentCode, page}};
-  }
-};
-using SalesPageFeed = addon::StoreFeed<PageFeedTraits>;
+using addon::SalesHeaderFeed;
+using addon::SalesPageFeed;
 
 // Registers in the feeds above; a page that is neither a history page nor the
 // live page is ignored.
