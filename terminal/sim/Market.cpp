@@ -797,6 +797,10 @@ JMarketInfo Market::MarketInfo(std::string_view exchangeCode) const {
 double Market::StepAt(std::int32_t tableId, double price, bool up) const { return d->Step(tableId, price, up); }
 
 void Market::AdvanceTo(std::uint32_t now) {
+  // Only whole steps are played; the rest of the stride stays owed to the next
+  // call, because `d->now` moves by whole steps only. A tick behind the
+  // market's (a clock stepped back) plays nothing.
+  if (std::int32_t(now - d->now) <= 0) return;
   std::uint32_t due = (now - d->now) / kStepMs;
   // A clock that jumped hours ahead (a suspended laptop) plays at most an hour.
   const std::uint32_t cap = 3600u * 1000u / kStepMs;

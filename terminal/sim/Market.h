@@ -113,7 +113,8 @@ class Market {
   double StepAt(std::int32_t tableId, double price, bool up = true) const;
 
   // ---- Time ----------------------------------------------------------------------
-  // Runs every whole step up to `now` (unsigned tick difference from the last).
+  // Runs every whole step up to `now` (unsigned tick difference from the last);
+  // what is left of a partial step counts towards the next call.
   void AdvanceTo(std::uint32_t now);
   std::uint32_t Now() const;
   // Session clock: "YYYY-MM-DD", "HH:MM:SS", milliseconds since midnight.

@@ -42,23 +42,35 @@ std::string Snapshot(Market& m, const std::vector<int>& sample) {
 
 }  // namespace
 
-TEST(Market, SameSeedAndClockGiveTheSameMarket) {
-  Market a(Config()), b(Config()), c(Config(8));
+TEST(Market, SameSeedAndClockGiveTheSameMarketWhateverTheStrides) {
+  Market a(Config()), b(Config()), c(Config()), other(Config(8));
   std::vector<int> sample;
   for (int i = 0; i < int(a.Instruments().size()); i += 97) sample.push_back(i);
-  for (int i : sample) { a.AddInterest(i); b.AddInterest(i); c.AddInterest(i); }
-  // The same ticks reached in different strides play the same steps.
+  for (int i : sample) { a.AddInterest(i); b.AddInterest(i); c.AddInterest(i); other.AddInterest(i); }
+  // Strides that are not whole steps (an early or late timer) lose no time:
+  // the part of a step left over counts towards the next call.
   a.AdvanceTo(30000);
-  for (std::uint32_t t = 1000; t <= 30000; t += 1000) b.AdvanceTo(t);
-  c.AdvanceTo(30000);
+  for (std::uint32_t t = 30; t <= 30000; t += 30) b.AdvanceTo(t);
+  for (std::uint32_t t = 75; t <= 30000; t += 75) c.AdvanceTo(t);
+  other.AdvanceTo(30000);
   ASSERT_EQ(a.Instruments().size(), b.Instruments().size());
   for (std::size_t k = 0; k < a.Instruments().size(); k += 50) {
     EXPECT_EQ(a.Instruments()[k].instrumentCode, b.Instruments()[k].instrumentCode);
     EXPECT_EQ(a.Instruments()[k].instrumentName, b.Instruments()[k].instrumentName);
   }
+  EXPECT_EQ(a.TimeText(), "10:30:30");
+  EXPECT_EQ(b.TimeText(), a.TimeText());
+  EXPECT_EQ(c.TimeText(), a.TimeText());
   EXPECT_EQ(Snapshot(a, sample), Snapshot(b, sample));
+  EXPECT_EQ(Snapshot(a, sample), Snapshot(c, sample));
   EXPECT_EQ(a.TakeChanged(), b.TakeChanged());
-  EXPECT_NE(Snapshot(a, sample), Snapshot(c, sample));
+  EXPECT_NE(Snapshot(a, sample), Snapshot(other, sample));
+
+  // A tick behind the market's plays nothing and loses nothing.
+  a.AdvanceTo(29000);
+  EXPECT_EQ(a.TimeText(), "10:30:30");
+  a.AdvanceTo(31000);
+  EXPECT_EQ(a.TimeText(), "10:30:31");
 }
 
 TEST(Market, ReferenceDataCoversProductsExchangesAndAccess) {
