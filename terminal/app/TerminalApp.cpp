@@ -152,12 +152,12 @@ bool TerminalApp::Start(std::string& error) {
 }
 
 void TerminalApp::OpenDefaultLayout() {
-  // A first start: the price view and, on the first instrument, its depth and trades.
+  // A first start: the price view and, on the busiest stock, its depth and trades.
   std::string error;
   OpenView("CPriceViewAdv", -1, {}, {}, {}, error);
-  const auto& instruments = m_runtime->Market().Instruments();
-  if (!instruments.empty()) {
-    const auto& first = instruments.front();
+  const int stock = m_runtime->Market().LiquidStock();
+  if (stock >= 0) {
+    const auto& first = m_runtime->Market().Instruments()[static_cast<std::size_t>(stock)];
     for (const char* cls : {"CMarketDepthAdv", "CTimeAndSalesAdv"}) {
       StartParamMap params{{"User_field_product_id", std::to_wstring(first.productId)},
                            {"User_field_save_space", L"0"}};

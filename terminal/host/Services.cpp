@@ -221,11 +221,11 @@ QFont StyleManager::GetFont(int id) const {
 
 std::vector<std::string> StyleManager::KnownImages() {
   return {
-      "images/Toolbar/[styleID]/InstrumentExplorer.bmp", "images/QuickBar/[styleID]/toList.bmp",
-      "images/QuickBar/[styleID]/tradeboard.bmp",        "images/QuickBar/[styleID]/CompanyInfo.bmp",
-      "images/QuickBar/[styleID]/toclose.bmp",           "images/Bitmaps/[styleID]/help.bmp",
-      "images/Products/ES.bmp",  "images/Products/CS.bmp", "images/Products/CFD.bmp",
-      "images/Products/FUT.bmp", "images/Products/FX.bmp", "images/Products/DMA.bmp",
+      "Toolbar/[styleID]/InstrumentExplorer.bmp", "QuickBar/[styleID]/toList.bmp",
+      "QuickBar/[styleID]/tradeboard.bmp",        "QuickBar/[styleID]/CompanyInfo.bmp",
+      "QuickBar/[styleID]/toclose.bmp",           "Bitmaps/[styleID]/help.bmp",
+      "Products/ES.bmp",  "Products/CS.bmp", "Products/CFD.bmp", "Products/FUT.bmp",
+      "Products/FX.bmp",  "Products/DMA.bmp", "Products/IDX.bmp",
   };
 }
 
@@ -235,6 +235,8 @@ std::wstring StyleManager::ResolveImagePath(const std::wstring& path, int styleI
   for (char& c : rel) if (c == '\\') c = '/';
   while (rel.rfind("./", 0) == 0) rel.erase(0, 2);
   while (!rel.empty() && rel.front() == '/') rel.erase(0, 1);
+  // The image folder is the terminal's "images" folder itself.
+  if (rel.rfind("images/", 0) == 0) rel.erase(0, 7);
   const std::string concrete = Replace(rel, "[styleID]", std::to_string(styleId));
   if (concrete.empty() || concrete.find("..") != std::string::npos) return {};
   const std::string file = imageDir_ + "/" + concrete;
@@ -307,7 +309,8 @@ bool StyleManager::Draw(const std::string& known, int styleId, const std::string
       // A coloured tag with the product type.
       const QColor tag = name == "CFD" ? QColor(200, 110, 20) : name == "FUT" ? QColor(120, 70, 170)
                          : name == "FX" ? QColor(20, 140, 140) : name == "DMA" ? QColor(170, 40, 80)
-                         : name == "CS" ? QColor(90, 110, 40) : QColor(30, 100, 200);
+                         : name == "CS" ? QColor(90, 110, 40) : name == "IDX" ? QColor(90, 96, 110)
+                         : QColor(30, 100, 200);
       g.setPen(Qt::NoPen);
       g.setBrush(tag);
       g.drawRoundedRect(QRectF(1, 2, w - 2, h - 4), 3, 3);

@@ -58,7 +58,8 @@ class StyleManager : public IStyleManager {
   void SetStyleID(int styleId);
   COLORREF GetColor(int colorId) const override;
   QFont GetFont(int fontId) const override;
-  // ".\images\Toolbar\[styleID]\InstrumentExplorer.bmp" -> "<imageDir>/images/Toolbar/1/InstrumentExplorer.bmp".
+  // ".\images\Toolbar\[styleID]\InstrumentExplorer.bmp" -> "<imageDir>/Toolbar/1/InstrumentExplorer.bmp"
+  // (`imageDir` is the terminal's "images" folder).
   // The image is drawn when it does not exist yet; empty for names the
   // terminal does not know.
   std::wstring ResolveImagePath(const std::wstring& path, int styleId) const override;
