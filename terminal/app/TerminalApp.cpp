@@ -18,6 +18,7 @@
 #include "terminal/app/GridDump.h"
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/SettingsDialog.h"
+#include "terminal/host/Services.h"
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteHostStore.h"
 #include "terminal/store/Store.h"
@@ -72,6 +73,20 @@ TerminalApp::~TerminalApp() {
 
 void TerminalApp::Progress(const std::string& line) const { std::fprintf(stderr, "terminal: %s\n", line.c_str()); }
 
+std::vector<MainWindow::ViewClass> TerminalApp::ViewClasses(bool addon) const {
+  QStringList classes;
+  if (addon) {
+    for (const QString& c : kAddonClasses)
+      if (m_addon.Find(c.toStdString())) classes << c;
+  } else {
+    classes = views::ClassNames();
+  }
+  std::vector<MainWindow::ViewClass> out;
+  for (const QString& c : classes)
+    out.push_back({c, QString::fromStdWString(ViewName(&m_runtime->Language(), c.toStdString()))});
+  return out;
+}
+
 const CRuntimeClass* TerminalApp::FindClass(const std::string& className) const {
   if (const CRuntimeClass* rc = m_addon.Find(className)) return rc;
   return views::FindClass(className);
@@ -99,10 +114,7 @@ bool TerminalApp::Start(std::string& error) {
   m_runtime = std::make_unique<HostRuntime>(ho, this, m_hostStore.get());
   views::SetRuntime(m_runtime.get());
 
-  QStringList addonClasses;
-  for (const QString& c : kAddonClasses)
-    if (m_addon.Find(c.toStdString())) addonClasses << c;
-  m_window = std::make_unique<MainWindow>(addonClasses, views::ClassNames(),
+  m_window = std::make_unique<MainWindow>(ViewClasses(true), ViewClasses(false),
                                           std::vector<MainWindow::Style>{{1, "&Light style"}, {2, "&Dark style"}},
                                           m_styleId);
   MainWindow* w = m_window.get();
@@ -115,6 +127,9 @@ bool TerminalApp::Start(std::string& error) {
     CWatchlistSetting watchlist = GetUserSettings().GetWatchlistSetting();
     watchlist.RefreshLanguage(&m_runtime->Language());
     if (!(watchlist == GetUserSettings().GetWatchlistSetting())) GetUserSettings().SetWatchlistSetting(watchlist);
+    std::vector<MainWindow::ViewClass> all = ViewClasses(true);
+    for (auto& c : ViewClasses(false)) all.push_back(c);
+    m_window->SetClassNames(all);
     m_runtime->ApplyLanguage();
   });
   connect(w, &MainWindow::fontSizeRequested, this, &TerminalApp::ShowFontSize);
@@ -248,7 +263,7 @@ void TerminalApp::ShowFontSize() {
 }
 
 void TerminalApp::ShowSettings() {
-  SettingsDialog dialog(m_window.get());
+  SettingsDialog dialog(&m_runtime->Language(), m_window.get());
   if (dialog.exec() != QDialog::Accepted) return;
   std::string problem;
   if (!dialog.Apply(GetUserSettings(), problem)) m_window->ShowNotice(QString::fromStdString(problem));

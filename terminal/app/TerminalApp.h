@@ -8,6 +8,7 @@
 #include <memory>
 #include <string>
 
+#include "terminal/app/MainWindow.h"
 #include "terminal/app/Options.h"
 #include "terminal/host/HostRuntime.h"
 
@@ -17,7 +18,6 @@ struct CRuntimeClass;
 namespace term {
 
 class AddonLoader;
-class MainWindow;
 class SqliteHostStore;
 class Store;
 class ViewDock;
@@ -74,6 +74,8 @@ class TerminalApp : public QObject, public IHostShell {
   void Progress(const std::string& line) const;
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
+  // The add-on's (or the terminal's own) classes with their names for a person.
+  std::vector<MainWindow::ViewClass> ViewClasses(bool addon) const;
 
   Options m_options;
   AddonLoader& m_addon;

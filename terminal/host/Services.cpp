@@ -67,11 +67,36 @@ const Entry kSection13[] = {
     {735, L"Triggered"}, {736, L"Expired"},
 };
 const Entry kSection30[] = {{1, L"Small"}, {2, L"Medium"}, {3, L"Large"}, {4, L"Extra Large"}};
+const Entry kTerminalTexts[] = {
+    {1, L"Price View"}, {2, L"Trade Ticket"}, {3, L"Chart"}, {4, L"Instrument Explorer"}, {5, L"Stock Analytics"},
+    {6, L"News"},
+    // Quote columns whose heading is blank.
+    {112, L"Product icon"}, {113, L"Link"}, {124, L"Change arrow"},
+};
+// Which text names a view class: section and entry.
+struct ViewNameEntry { const char* className; int section; int entry; };
+const ViewNameEntry kViewNames[] = {
+    {"CPriceViewAdv", kTerminalSection, 1}, {"CMarketDepthAdv", 13, 7},      {"CTimeAndSalesAdv", 13, 8},
+    {"CTradeSummaryAdv", 13, 10},           {"CPriceAlertList", 13, 9},      {"CNewPriceAlertAdv", 13, 725},
+    {"CTradeView", kTerminalSection, 2},    {"CBranticChartView", kTerminalSection, 3},
+    {"CInsExpViewEx", kTerminalSection, 4}, {"CStockAnalytics", kTerminalSection, 5},
+    {"CFNews", kTerminalSection, 6},
+};
 }  // namespace
+
+std::wstring ViewName(const ILanguage* language, const std::string& className) {
+  for (const ViewNameEntry& v : kViewNames) {
+    if (className != v.className) continue;
+    std::wstring text = language ? language->GetText(v.section, v.entry) : std::wstring();
+    if (!text.empty()) return text;
+  }
+  return hv::Widen(className);
+}
 
 LanguageTable::LanguageTable() {
   for (const Entry& e : kSection13) texts_[{13, e.id}] = e.text;
   for (const Entry& e : kSection30) texts_[{30, e.id}] = e.text;
+  for (const Entry& e : kTerminalTexts) texts_[{kTerminalSection, e.id}] = e.text;
 }
 
 std::wstring LanguageTable::GetText(int section, int entry) const {

@@ -35,7 +35,7 @@ std::vector<BlotterOrder>& Blotter();
 class CTradeView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "Trade ticket"; }
+  QString Caption() const override { return NameFor("CTradeView"); }
 
  protected:
   void Build() override;
@@ -64,7 +64,7 @@ class CTradeView : public CTerminalView {
 class CChartView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "Chart"; }
+  QString Caption() const override { return NameFor("CBranticChartView"); }
   // Number of points drawn (tests).
   Q_INVOKABLE int pointCount() const;
 
@@ -86,7 +86,7 @@ class CChartView : public CTerminalView {
 class CExplorerView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "Instrument explorer"; }
+  QString Caption() const override { return NameFor("CInsExpViewEx"); }
   // Searches as if typed (tests and scripts).
   Q_INVOKABLE void search(const QString& text);
   Q_INVOKABLE int resultCount() const;
@@ -110,7 +110,7 @@ class CExplorerView : public CTerminalView {
 class CAnalyticsView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "Stock analytics"; }
+  QString Caption() const override { return NameFor("CStockAnalytics"); }
 
  protected:
   void Build() override;
@@ -125,7 +125,7 @@ class CAnalyticsView : public CTerminalView {
 class CNewsView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "News"; }
+  QString Caption() const override { return NameFor("CFNews"); }
 
  protected:
   void Build() override;

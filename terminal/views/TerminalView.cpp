@@ -8,6 +8,7 @@
 #include "hostview/StyleRoles.h"
 #include "hostview/Text.h"
 #include "terminal/host/HostRuntime.h"
+#include "terminal/host/Services.h"
 #include "terminal/sim/Market.h"
 #include "terminal/views/OwnViews.h"
 
@@ -150,6 +151,10 @@ void CTerminalView::ApplyLanguage() { SendTitle(); }
 
 void CTerminalView::OnTimer(UINT id) {
   if (id == kRefreshTimer) Refresh();
+}
+
+QString CTerminalView::NameFor(const char* className) const {
+  return QString::fromStdWString(ViewName(GetLanguage(), className));
 }
 
 QString CTerminalView::InstrumentLabel() const {

@@ -64,6 +64,8 @@ class CTerminalView : public CSuperBaseView, public platform::TimerHandler {
   virtual UINT RefreshInterval() const { return 1000; }
   void SendTitle();
   QString InstrumentLabel() const;
+  // The class's name for a person, from the language table.
+  QString NameFor(const char* className) const;
 
   int m_instrument = -1;
   std::wstring m_title;
