@@ -4,6 +4,7 @@
 #include <QDir>
 #include <QFile>
 #include <QInputDialog>
+#include <QPalette>
 #include <QPixmap>
 #include <QTextStream>
 #include <cstdio>
@@ -12,12 +13,14 @@
 
 #include "hostconfig/UserSettings.h"
 #include "hostview/MessageIds.h"
+#include "hostview/StyleRoles.h"
 #include "hostview/Text.h"
 #include "platform/Platform.h"
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/SettingsDialog.h"
+#include "terminal/app/TerminalStyle.h"
 #include "terminal/host/Services.h"
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteHostStore.h"
@@ -110,9 +113,12 @@ bool TerminalApp::Start(std::string& error) {
     m_hostStore = std::make_unique<SqliteHostStore>(
         *m_store, [this](const std::string& e) { Progress("error: " + e); });
   }
+  if (m_options.style) ho.styleId = *m_options.style;
   m_styleId = ho.styleId;
   m_runtime = std::make_unique<HostRuntime>(ho, this, m_hostStore.get());
   views::SetRuntime(m_runtime.get());
+  if (!qobject_cast<TerminalStyle*>(QApplication::style())) QApplication::setStyle(new TerminalStyle);
+  ApplyStyleToApplication();
 
   m_window = std::make_unique<MainWindow>(ViewClasses(true), ViewClasses(false),
                                           std::vector<MainWindow::Style>{{1, "&Light style"}, {2, "&Dark style"}},
@@ -246,7 +252,44 @@ void TerminalApp::OnDrop(CSuperBaseView* target, const QString& source, const QS
 void TerminalApp::ChangeStyle(int styleId) {
   m_styleId = styleId;
   m_runtime->ChangeStyle(styleId);
+  ApplyStyleToApplication();
   if (m_store) m_store->SaveSetting("ui.style", std::to_string(styleId));
+}
+
+void TerminalApp::ApplyStyleToApplication() {
+  // The views colour themselves from the style manager; everything else the
+  // terminal shows (menus, dock titles and tabs, the status bar, the empty
+  // parts of the window, dialogs) takes the same colours from this palette.
+  const IStyleManager& st = m_runtime->Styles();
+  using namespace hv::style;
+  const QColor face = st.Color(kFace), text = st.Color(kText), base = st.Color(kWindow),
+               muted = st.Color(kMutedText), border = st.Color(kBorder);
+  const bool dark = face.lightness() < 128;
+  QPalette pal;
+  for (QPalette::ColorGroup g : {QPalette::Active, QPalette::Inactive, QPalette::Disabled}) {
+    const bool off = g == QPalette::Disabled;
+    pal.setColor(g, QPalette::Window, face);
+    pal.setColor(g, QPalette::WindowText, off ? muted : text);
+    pal.setColor(g, QPalette::Base, off ? face : base);
+    pal.setColor(g, QPalette::AlternateBase, st.Color(107));
+    pal.setColor(g, QPalette::Text, off ? muted : text);
+    pal.setColor(g, QPalette::Button, face);
+    pal.setColor(g, QPalette::ButtonText, off ? muted : text);
+    pal.setColor(g, QPalette::BrightText, dark ? QColor(Qt::white) : QColor(Qt::black));
+    pal.setColor(g, QPalette::Highlight, st.Color(kSelection));
+    pal.setColor(g, QPalette::HighlightedText, st.Color(kSelectionText));
+    pal.setColor(g, QPalette::ToolTipBase, face);
+    pal.setColor(g, QPalette::ToolTipText, text);
+    pal.setColor(g, QPalette::PlaceholderText, muted);
+    pal.setColor(g, QPalette::Link, st.Color(kLinkText));
+    pal.setColor(g, QPalette::LinkVisited, st.Color(kLinkText));
+    pal.setColor(g, QPalette::Light, dark ? face.lighter(130) : QColor(Qt::white));
+    pal.setColor(g, QPalette::Midlight, dark ? face.lighter(115) : face.lighter(105));
+    pal.setColor(g, QPalette::Mid, border);
+    pal.setColor(g, QPalette::Dark, dark ? face.darker(140) : border.darker(115));
+    pal.setColor(g, QPalette::Shadow, dark ? QColor(0, 0, 0) : border.darker(160));
+  }
+  QApplication::setPalette(pal);
 }
 
 void TerminalApp::ShowFontSize() {

@@ -71,6 +71,8 @@ class TerminalApp : public QObject, public IHostShell {
   void ShowSettings();
   void ShowFontSize();
   void ChangeStyle(int styleId);
+  // The whole application (menus, docks, status bar, dialogs) in the style's colours.
+  void ApplyStyleToApplication();
   void Progress(const std::string& line) const;
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);

@@ -99,7 +99,10 @@ int main(int argc, char** argv) {
   }
   if (!options.verbose) qInstallMessageHandler(QuietQtMessages);
 
-  QApplication app(argc, argv);
+  // Qt sees only the program name: the options are the terminal's (Qt would
+  // take "--style" for its own).
+  int qtArgc = 1;
+  QApplication app(qtArgc, argv);
   QApplication::setApplicationName("marketviews-terminal");
 
   term::AddonLoader addon;

@@ -142,6 +142,10 @@ void CTerminalView::ChangeStyle(int styleId) {
   pal.setColor(QPalette::Text, m_pStyleManager->Color(hv::style::kEditText));
   pal.setColor(QPalette::Button, m_pStyleManager->Color(hv::style::kButtonFace));
   pal.setColor(QPalette::ButtonText, m_pStyleManager->Color(hv::style::kButtonText));
+  pal.setColor(QPalette::PlaceholderText, m_pStyleManager->Color(hv::style::kMutedText));
+  pal.setColor(QPalette::AlternateBase, m_pStyleManager->Color(107));
+  pal.setColor(QPalette::Highlight, m_pStyleManager->Color(hv::style::kSelection));
+  pal.setColor(QPalette::HighlightedText, m_pStyleManager->Color(hv::style::kSelectionText));
   setPalette(pal);
   setAutoFillBackground(true);
   update();
