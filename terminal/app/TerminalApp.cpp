@@ -117,6 +117,23 @@ bool TerminalApp::Start(std::string& error) {
   m_styleId = ho.styleId;
   m_runtime = std::make_unique<HostRuntime>(ho, this, m_hostStore.get());
   views::SetRuntime(m_runtime.get());
+  m_log = m_runtime->LogFactory().CreateLogger();
+
+  // Instruments named on the command line must exist: a timed run stops
+  // before it starts, a window opens the view without one and says why.
+  std::vector<std::string> unknownInstruments(m_options.open.size());
+  for (std::size_t k = 0; k < m_options.open.size(); ++k) {
+    const OpenRequest& o = m_options.open[k];
+    if (o.productId < 0 || m_runtime->Market().Find(o.productId, o.instrumentCode) >= 0) continue;
+    unknownInstruments[k] = "unknown instrument " + std::to_string(o.productId) + ":" + o.instrumentCode +
+                            " in --open " + o.className + ":" + std::to_string(o.productId) + ":" +
+                            o.instrumentCode + " (--list-instruments lists the instruments)";
+    if (timed()) {
+      error = unknownInstruments[k];
+      m_startExitCode = 2;
+      return false;
+    }
+  }
   if (!qobject_cast<TerminalStyle*>(QApplication::style())) QApplication::setStyle(new TerminalStyle);
   ApplyStyleToApplication();
 
@@ -148,19 +165,24 @@ bool TerminalApp::Start(std::string& error) {
 
   int restored = 0;
   if (m_options.restoreLayout) restored = RestoreLayout();
-  for (const auto& o : m_options.open) {
+  for (std::size_t k = 0; k < m_options.open.size(); ++k) {
+    const OpenRequest& o = m_options.open[k];
+    const bool known = o.productId >= 0 && unknownInstruments[k].empty();
     StartParamMap params;
-    if (o.productId >= 0) {
+    if (known) {
       params["User_field_product_id"] = std::to_wstring(o.productId);
       params["User_field_save_space"] = L"0";
     }
-    CSuperBaseView* v = OpenView(o.className, o.productId, o.instrumentCode, params, {}, error);
+    CSuperBaseView* v = OpenView(o.className, known ? o.productId : -1, known ? o.instrumentCode : std::string(),
+                                 params, {}, error);
     if (!v) return false;
-    if (o.productId >= 0) DeliverLink(v, o.productId, o.instrumentCode);
+    if (known) DeliverLink(v, o.productId, o.instrumentCode);
+    if (!unknownInstruments[k].empty()) ReportProblem(QString::fromStdString("The " + unknownInstruments[k]) +
+                                                          ". The view opened without an instrument.", true);
   }
   if (restored == 0 && m_options.open.empty()) OpenDefaultLayout();
 
-  if (!m_options.seconds && !m_options.headless) {
+  if (!timed()) {
     // Real time: move the market along with the monotonic clock.
     connect(&m_pump, &QTimer::timeout, this, [this] { m_runtime->PumpNow(); });
     m_pump.start(kPumpMs);
@@ -292,6 +314,20 @@ void TerminalApp::ApplyStyleToApplication() {
   QApplication::setPalette(pal);
 }
 
+void TerminalApp::ReportProblem(const QString& text, bool dialog) {
+  const std::string line = text.toStdString();
+  if (m_log) m_log->Log(4, "%s", line.c_str());
+  Progress("warning: " + line);
+  if (!m_window) return;
+  m_window->ShowNotice(text);
+  if (!dialog || timed()) return;
+  // After the window is up, so that the box has it as its parent.
+  QTimer::singleShot(0, m_window.get(), [this, text] {
+    platform::Dialogs().MessageBox(m_window.get(), m_window->windowTitle(), text, platform::Icon::Warning,
+                                   platform::Buttons::Ok);
+  });
+}
+
 void TerminalApp::ShowFontSize() {
   // 616 goes to the price views: the active one when a price view is active, else all.
   CSuperBaseView* active = m_window->ActiveView();
@@ -351,7 +387,8 @@ int TerminalApp::RestoreLayout() {
                                  QString::fromStdString(sv.objectName), error);
     if (!v) {
       // A view the add-on no longer offers: the rest of the layout still comes back.
-      Progress("warning: saved view " + sv.className + " not restored: " + error);
+      ReportProblem(QString::fromStdString("The saved view " + sv.className + " was not restored: " + error + "."),
+                    false);
       continue;
     }
     opened.push_back(v);
@@ -458,7 +495,7 @@ void TerminalApp::RequestStop() {
   if (m_stopRequested) return;
   m_stopRequested = true;
   Progress("stopping");
-  if (!m_options.seconds && !m_options.headless) QCoreApplication::quit();
+  if (!timed()) QCoreApplication::quit();
 }
 
 void TerminalApp::Shutdown() {
@@ -466,7 +503,7 @@ void TerminalApp::Shutdown() {
   m_shutDown = true;
   m_pump.stop();
   m_autosave.stop();
-  if (!m_options.seconds && !m_options.headless) SaveLayout();
+  if (!timed()) SaveLayout();
   m_window->CloseAllViews();
 }
 
@@ -489,8 +526,11 @@ CSuperBaseView* TerminalApp::OpenView(const std::wstring& className, CSuperBaseV
   return v;
 }
 
-void TerminalApp::ForeignLink(const std::wstring& className, const std::wstring& linkText, CSuperBaseView*) {
-  m_window->ShowNotice(QString("No view of class %1 in this terminal.").arg(QString::fromStdWString(className)));
+void TerminalApp::ForeignLink(const std::wstring& className, const std::wstring& linkText, CSuperBaseView* requester) {
+  const QString from = requester ? m_window->NameOf(QString::fromStdString(m_runtime->ClassNameOf(requester))) : QString();
+  ReportProblem(QString("%1 asked for a view of class %2, which this terminal does not have.")
+                    .arg(from.isEmpty() ? QString("A view") : from, QString::fromStdWString(className)),
+                false);
 }
 
 void TerminalApp::ShowNotice(const std::wstring& title, const std::wstring& text) {

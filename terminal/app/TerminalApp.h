@@ -30,7 +30,14 @@ class TerminalApp : public QObject, public IHostShell {
   ~TerminalApp() override;
 
   // Builds the runtime and the window, restores the layout and opens --open.
+  // False with `error` when the terminal cannot run; StartExitCode() says how
+  // to end (2: the command line named something that does not exist).
   bool Start(std::string& error);
+  int StartExitCode() const { return m_startExitCode; }
+  // A problem the user must hear of without the terminal stopping: a line in
+  // the log and on standard error, the status bar, and with `dialog` (and a
+  // window to show it in) a message box.
+  void ReportProblem(const QString& text, bool dialog);
   // Headless or --seconds: runs the simulated seconds, writes dumps and
   // snapshots, saves. Returns the process exit code.
   int RunTimed();
@@ -74,6 +81,8 @@ class TerminalApp : public QObject, public IHostShell {
   // The whole application (menus, docks, status bar, dialogs) in the style's colours.
   void ApplyStyleToApplication();
   void Progress(const std::string& line) const;
+  // Headless or --seconds: the virtual clock, nobody at the window.
+  bool timed() const { return m_options.headless || m_options.seconds.has_value(); }
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
   // The add-on's (or the terminal's own) classes with their names for a person.
@@ -90,6 +99,8 @@ class TerminalApp : public QObject, public IHostShell {
   bool m_shutDown = false;
   bool m_stopRequested = false;
   int m_styleId = 1;
+  int m_startExitCode = 1;
+  ILogger* m_log = nullptr;
 };
 
 }  // namespace term

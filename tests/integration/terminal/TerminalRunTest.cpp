@@ -119,6 +119,9 @@ TEST(TerminalRefusal, MissingAddonIsNamedAndRefused) {
   EXPECT_EQ(Lines(r.err).size(), 1u) << r.err;
   EXPECT_TRUE(r.out.empty());
   EXPECT_FALSE(fs::exists(dir.path / "terminal.db")) << "a refused start touches no data";
+  EXPECT_NE(ReadFile(dir.path / "logs" / "terminal.log").find("cannot load the add-on /nowhere/libmarketviews.so"),
+            std::string::npos)
+      << "and says why in the log";
 }
 
 TEST(TerminalRefusal, LibraryWithoutEntryPointIsRefused) {
@@ -144,6 +147,19 @@ TEST(TerminalRefusal, UnknownClassAndBadOptionsAreRefused) {
   r = RunTerminal({"--open", "CMarketDepthAdv:x:D05"});
   EXPECT_EQ(r.exitCode, 2);
   EXPECT_NE(r.err.find("product id"), std::string::npos) << r.err;
+}
+
+TEST(TerminalRefusal, UnknownInstrumentInOpenEndsAHeadlessRunWithTwo) {
+  TempDir dir;
+  const RunResult r = RunTerminal(With(kSmallMarket, {"--data-dir", dir.path.string(), "--seconds", "1", "--open",
+                                                      "CMarketDepthAdv:101:NOSUCH", "--snapshot",
+                                                      (dir.path / "shots").string()}));
+  EXPECT_EQ(r.exitCode, 2) << r.err;
+  EXPECT_NE(r.err.find("unknown instrument 101:NOSUCH"), std::string::npos) << r.err;
+  EXPECT_NE(r.err.find("--list-instruments"), std::string::npos) << "the message says where to look: " << r.err;
+  EXPECT_EQ(r.err.find("running"), std::string::npos) << "nothing ran: " << r.err;
+  EXPECT_FALSE(fs::exists(dir.path / "shots"));
+  EXPECT_NE(ReadFile(dir.path / "logs" / "terminal.log").find("unknown instrument 101:NOSUCH"), std::string::npos);
 }
 
 TEST(TerminalList, ListInstrumentsPrintsTabSeparatedRowsDeterministically) {
@@ -239,6 +255,8 @@ TEST(TerminalHeadless, CorruptDatabaseIsSetAsideAndReported) {
   for (const auto& name : FileNames(dir.path))
     if (name.rfind("terminal.db.corrupt-", 0) == 0 && ReadFile(dir.path / name) == garbage) ++kept;
   EXPECT_EQ(kept, 1);
+  EXPECT_NE(ReadFile(dir.path / "logs" / "terminal.log").find("cannot be read"), std::string::npos)
+      << "the log says it too";
 }
 
 // The very first start: the price view, and depth and trades of the busiest
