@@ -25,6 +25,7 @@
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteHostStore.h"
 #include "terminal/store/Store.h"
+#include "terminal/views/Blotter.h"
 #include "terminal/views/TerminalView.h"
 
 namespace term {
@@ -71,6 +72,7 @@ TerminalApp::TerminalApp(const Options& options, AddonLoader& addon, Store* stor
 
 TerminalApp::~TerminalApp() {
   Shutdown();
+  views::SetBlotter(nullptr);
   views::SetRuntime(nullptr);
 }
 
@@ -118,6 +120,8 @@ bool TerminalApp::Start(std::string& error) {
   m_runtime = std::make_unique<HostRuntime>(ho, this, m_hostStore.get());
   views::SetRuntime(m_runtime.get());
   m_log = m_runtime->LogFactory().CreateLogger();
+  m_blotter = std::make_unique<views::Blotter>(m_store, m_runtime->Market().DateText());
+  views::SetBlotter(m_blotter.get());
 
   // Instruments named on the command line must exist: a timed run stops
   // before it starts, a window opens the view without one and says why.
@@ -184,7 +188,7 @@ bool TerminalApp::Start(std::string& error) {
 
   if (!timed()) {
     // Real time: move the market along with the monotonic clock.
-    connect(&m_pump, &QTimer::timeout, this, [this] { m_runtime->PumpNow(); });
+    connect(&m_pump, &QTimer::timeout, this, [this] { Pump(platform::TickCount()); });
     m_pump.start(kPumpMs);
     // The layout is also saved now and then, so a crash or a kill loses little of it.
     connect(&m_autosave, &QTimer::timeout, this, [this] { SaveLayout(); });
@@ -192,6 +196,11 @@ bool TerminalApp::Start(std::string& error) {
   }
   m_window->show();
   return true;
+}
+
+void TerminalApp::Pump(std::uint32_t now) {
+  m_runtime->Pump(now);
+  if (m_blotter) m_blotter->CheckFills(m_runtime->Market());
 }
 
 void TerminalApp::OpenDefaultLayout() {
@@ -416,7 +425,7 @@ int TerminalApp::RunTimed() {
            std::to_string(m_window->Docks().size()) + " views");
   for (long long i = 0; i < steps && !m_shutDown && !m_stopRequested; ++i) {
     clock.Advance(kPumpMs);
-    m_runtime->Pump(clock.Now());
+    Pump(clock.Now());
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }

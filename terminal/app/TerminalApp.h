@@ -18,6 +18,9 @@ struct CRuntimeClass;
 namespace term {
 
 class AddonLoader;
+namespace views {
+class Blotter;
+}
 class SqliteHostStore;
 class Store;
 class ViewDock;
@@ -41,6 +44,8 @@ class TerminalApp : public QObject, public IHostShell {
   // Headless or --seconds: runs the simulated seconds, writes dumps and
   // snapshots, saves. Returns the process exit code.
   int RunTimed();
+  // Moves the market to `now`, delivers what changed and fills working orders.
+  void Pump(std::uint32_t now);
   // Saves the layout and closes every view (idempotent).
   void Shutdown();
   // Ends a timed run early (after the current step) or the event loop (SIGINT, SIGTERM).
@@ -93,6 +98,7 @@ class TerminalApp : public QObject, public IHostShell {
   Store* m_store;
   std::unique_ptr<SqliteHostStore> m_hostStore;
   std::unique_ptr<HostRuntime> m_runtime;
+  std::unique_ptr<views::Blotter> m_blotter;
   std::unique_ptr<MainWindow> m_window;
   QTimer m_pump;
   QTimer m_autosave;

@@ -27,6 +27,7 @@
 
 #include "terminal/host/HostRuntime.h"
 #include "terminal/sim/Market.h"
+#include "terminal/views/Blotter.h"
 
 namespace term::views {
 
@@ -77,22 +78,29 @@ void SetRow(QTableWidget* t, int row, const QStringList& cells) {
 
 }  // namespace
 
-std::vector<BlotterOrder>& Blotter() {
-  static std::vector<BlotterOrder> orders;
-  return orders;
-}
-
 // ---- Trade ticket -----------------------------------------------------------
 
 void CTradeView::Build() {
   auto* layout = new QVBoxLayout(this);
   auto* form = new QFormLayout;
   m_instrumentLabel = new QLabel(this);
-  m_quoteLabel = new QLabel(this);
   m_side = new QComboBox(this);
   m_side->addItems({"Buy", "Sell"});
+  if (Blotter* b = CurrentBlotter()) m_side->setCurrentText(b->LastSide());
   m_price = new QDoubleSpinBox(this);
+  m_price->setObjectName("price");
   m_price->setRange(0, 1e9);
+  // The live quote beside the price: a ticket left open shows how far the market went.
+  m_bidLabel = new QLabel(this);
+  m_bidLabel->setObjectName("live-bid");
+  m_askLabel = new QLabel(this);
+  m_askLabel->setObjectName("live-ask");
+  m_lastLabel = new QLabel(this);
+  auto* priceRow = new QHBoxLayout;
+  priceRow->addWidget(m_price, 1);
+  priceRow->addWidget(m_bidLabel);
+  priceRow->addWidget(m_askLabel);
+  priceRow->addWidget(m_lastLabel);
   m_quantity = new QSpinBox(this);
   m_quantity->setRange(0, 1000000000);
   m_type = new QComboBox(this);
@@ -101,9 +109,8 @@ void CTradeView::Build() {
   m_validity->addItems({"Day", "Good till cancelled", "Fill and kill"});
   m_trigger = new QLabel("-", this);
   form->addRow("Instrument", m_instrumentLabel);
-  form->addRow("Quote", m_quoteLabel);
   form->addRow("Side", m_side);
-  form->addRow("Price", m_price);
+  form->addRow("Price", priceRow);
   form->addRow("Quantity", m_quantity);
   form->addRow("Order type", m_type);
   form->addRow("Validity", m_validity);
@@ -120,6 +127,16 @@ void CTradeView::Build() {
   layout->addWidget(m_blotter, 1);
   connect(m_place, &QPushButton::clicked, this, [this] { PlaceOrder(); });
   connect(m_type, &QComboBox::currentTextChanged, this, [this](const QString& t) { m_price->setEnabled(t != "Market"); });
+  // The user's choice of side is the next ticket's side too.
+  connect(m_side, &QComboBox::activated, this, [this] {
+    if (Blotter* b = CurrentBlotter()) b->SetLastSide(m_side->currentText());
+  });
+}
+
+double CTradeView::price() const { return m_price ? m_price->value() : 0; }
+QString CTradeView::side() const { return m_side ? m_side->currentText() : QString(); }
+QString CTradeView::liveQuote() const {
+  return m_bidLabel ? m_bidLabel->text() + "  " + m_askLabel->text() : QString();
 }
 
 void CTradeView::InstrumentChanged() {
@@ -127,13 +144,19 @@ void CTradeView::InstrumentChanged() {
   m_instrumentLabel->setText(ins ? InstrumentLabel() + " (" + QString::fromStdString(ins->exchangeCode) + ")"
                                  : QStringLiteral("(none)"));
   if (!ins) return;
+  // Decimals first: a price set before would be rounded to the old ones.
   m_price->setDecimals(std::clamp(ins->decimals, 0, 8));
   m_quantity->setSingleStep(static_cast<int>(std::max<std::int64_t>(1, ins->lotSize)));
   if (m_quantity->value() == 0) m_quantity->setValue(static_cast<int>(std::max<std::int64_t>(1, ins->lotSize)));
-  if (m_price->value() == 0) {
-    const auto& q = MarketOrNull()->QuoteOf(m_instrument);
+  const auto& q = MarketOrNull()->QuoteOf(m_instrument);
+  if (m_linkPrice > 0) {
+    m_price->setValue(m_linkPrice);
+    m_linkPrice = 0;
+  } else if (m_price->value() == 0) {
     m_price->setValue(m_side->currentText() == "Buy" ? q.ask : q.bid);
   }
+  const double at = m_price->value() > 0 ? m_price->value() : std::max(q.last, q.close);
+  m_price->setSingleStep(MarketOrNull()->StepAt(ins->priceStepTableId, at > 0 ? at : 1.0));
 }
 
 void CTradeView::TakeLink(const std::map<std::string, std::string>& link) {
@@ -144,8 +167,10 @@ void CTradeView::TakeLink(const std::map<std::string, std::string>& link) {
   if (const QString side = get("Field_side"); side.compare("Sell", Qt::CaseInsensitive) == 0) m_side->setCurrentIndex(1);
   else if (side.compare("Buy", Qt::CaseInsensitive) == 0) m_side->setCurrentIndex(0);
   bool ok = false;
-  if (const double p = get("Field_Trade_price").toDouble(&ok); ok && p > 0) m_price->setValue(p);
-  else m_price->setValue(0);  // taken from the quote once the instrument is known
+  // The clicked price is kept as it was; without one the ticket starts at the touch.
+  const double p = get("Field_Trade_price").toDouble(&ok);
+  m_linkPrice = ok && p > 0 ? p : 0;
+  m_price->setValue(0);
   if (const qlonglong q = get("Field_qty").toLongLong(&ok); ok && q > 0) m_quantity->setValue(static_cast<int>(q));
   if (const QString type = get("Field_Order_type"); !type.isEmpty()) {
     if (m_type->findText(type) < 0) m_type->addItem(type);
@@ -160,31 +185,24 @@ void CTradeView::TakeLink(const std::map<std::string, std::string>& link) {
 }
 
 void CTradeView::Refresh() {
-  if (const auto* ins = InstrumentAt(m_instrument)) {
+  if (InstrumentAt(m_instrument)) {
     const auto& q = MarketOrNull()->QuoteOf(m_instrument);
-    m_quoteLabel->setText(QString("Bid %1  Ask %2  Last %3")
-                              .arg(Price(m_instrument, q.bid), Price(m_instrument, q.ask), Price(m_instrument, q.last)));
-    (void)ins;
+    m_bidLabel->setText("Bid " + Price(m_instrument, q.bid));
+    m_askLabel->setText("Ask " + Price(m_instrument, q.ask));
+    m_lastLabel->setText("Last " + Price(m_instrument, q.last));
   } else {
-    m_quoteLabel->setText("-");
-  }
-  // Working orders fill once the market reaches them.
-  if (sim::Market* m = MarketOrNull()) {
-    for (auto& o : Blotter()) {
-      if (o.status != "Working") continue;
-      const int index = m->FindByCode(o.code.toStdString());
-      if (index < 0) continue;
-      const auto& q = m->QuoteOf(index);
-      if ((o.side == "Buy" && q.ask > 0 && q.ask <= o.price) || (o.side == "Sell" && q.bid > 0 && q.bid >= o.price))
-        o.status = "Filled";
-    }
+    m_bidLabel->setText({});
+    m_askLabel->setText({});
+    m_lastLabel->setText({});
   }
   FillBlotter();
 }
 
 void CTradeView::PlaceOrder() {
+  Blotter* blotter = CurrentBlotter();
   const auto* ins = InstrumentAt(m_instrument);
   if (!ins) { m_message->setText("Choose an instrument first."); return; }
+  if (!blotter) { m_message->setText("Orders cannot be placed in this terminal."); return; }
   if (ins->accessStatus != 3) { m_message->setText("This instrument cannot be traded."); return; }
   const qint64 qty = m_quantity->value();
   const qint64 lot = std::max<std::int64_t>(1, ins->lotSize);
@@ -202,9 +220,9 @@ void CTradeView::PlaceOrder() {
   const double touch = buy ? q.ask : q.bid;
   if (!market && m_price->value() <= 0) { m_message->setText("Enter a price."); return; }
   BlotterOrder o;
-  o.number = static_cast<int>(Blotter().size()) + 1;
   o.time = QString::fromStdString(MarketOrNull()->TimeText());
   o.side = buy ? "Buy" : "Sell";
+  o.productId = ins->productId;
   o.code = QString::fromStdString(ins->instrumentCode);
   o.quantity = qty;
   o.type = m_type->currentText();
@@ -213,22 +231,27 @@ void CTradeView::PlaceOrder() {
   const bool marketable = touch > 0 && (market || (buy ? m_price->value() >= touch : m_price->value() <= touch));
   o.price = marketable ? touch : m_price->value();
   o.status = marketable ? "Filled" : (m_validity->currentText() == "Fill and kill" ? "Cancelled" : "Working");
-  Blotter().push_back(o);
-  m_message->setText(QString("Order %1 %2.").arg(o.number).arg(o.status.toLower()));
+  const BlotterOrder& kept = blotter->Add(std::move(o));
+  QString text = QString("Order %1 %2.").arg(kept.number).arg(kept.status.toLower());
+  if (!blotter->LastError().empty())
+    text += QString(" It could not be saved: %1").arg(QString::fromStdString(blotter->LastError()));
+  m_message->setText(text);
   FillBlotter();
 }
 
 void CTradeView::FillBlotter() {
-  const auto& orders = Blotter();
+  const Blotter* blotter = CurrentBlotter();
+  if (!blotter || blotter->Version() == m_shownVersion) return;
+  m_shownVersion = blotter->Version();
+  const auto& orders = blotter->Orders();
   m_blotter->setRowCount(static_cast<int>(orders.size()));
   for (std::size_t i = 0; i < orders.size(); ++i) {
     const auto& o = orders[orders.size() - 1 - i];  // newest first
-    const int index = MarketOrNull() ? MarketOrNull()->FindByCode(o.code.toStdString()) : -1;
+    const int index = MarketOrNull() ? MarketOrNull()->Find(o.productId, o.code.toStdString()) : -1;
     SetRow(m_blotter, static_cast<int>(i),
            {QString::number(o.number), o.time, o.side, o.code, Grouped(o.quantity),
             index >= 0 ? Price(index, o.price) : QString::number(o.price), o.type, o.validity, o.status});
   }
-  m_shownOrders = orders.size();
 }
 
 // ---- Chart ------------------------------------------------------------------

@@ -22,34 +22,36 @@ class QDateTimeAxis;
 
 namespace term::views {
 
-// One simulated order of the blotter, shared by every trade ticket.
-struct BlotterOrder {
-  int number = 0;
-  QString time, side, code, type, validity, trigger, status;
-  double price = 0;
-  qint64 quantity = 0;
-};
-std::vector<BlotterOrder>& Blotter();
-
-// Trade ticket: shows what the link carries and records simulated orders.
+// Trade ticket: shows what the link carries and records simulated orders in
+// the blotter (Blotter.h). The price stays the one the user clicked; the live
+// bid and ask beside it show how far the market has moved since.
 class CTradeView : public CTerminalView {
   Q_OBJECT
  public:
   QString Caption() const override { return NameFor("CTradeView"); }
+  // Tests and scripts: the ticket's price and the live quote beside it.
+  Q_INVOKABLE double price() const;
+  Q_INVOKABLE QString side() const;
+  Q_INVOKABLE QString liveQuote() const;
+  Q_INVOKABLE void placeOrder() { PlaceOrder(); }
 
  protected:
   void Build() override;
   void Refresh() override;
   void TakeLink(const std::map<std::string, std::string>& link) override;
   void InstrumentChanged() override;
+  UINT RefreshInterval() const override { return 250; }
 
  private:
   void PlaceOrder();
   void FillBlotter();
   QLabel* m_instrumentLabel = nullptr;
-  QLabel* m_quoteLabel = nullptr;
+  QLabel* m_bidLabel = nullptr;
+  QLabel* m_askLabel = nullptr;
+  QLabel* m_lastLabel = nullptr;
   QComboBox* m_side = nullptr;
   QDoubleSpinBox* m_price = nullptr;
+  double m_linkPrice = 0;  // the price the link carried, set once the instrument's decimals are known
   QSpinBox* m_quantity = nullptr;
   QComboBox* m_type = nullptr;
   QComboBox* m_validity = nullptr;
@@ -57,7 +59,7 @@ class CTradeView : public CTerminalView {
   QLabel* m_message = nullptr;
   QPushButton* m_place = nullptr;
   QTableWidget* m_blotter = nullptr;
-  std::size_t m_shownOrders = 0;
+  std::uint64_t m_shownVersion = 0;
 };
 
 // Price chart of the instrument's traded prices in the session.
