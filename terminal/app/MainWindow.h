@@ -8,6 +8,8 @@
 #include <map>
 #include <vector>
 
+#include "hostview/DragData.h"
+
 class CSuperBaseView;
 class QActionGroup;
 class QLabel;
@@ -16,10 +18,12 @@ class QMimeData;
 
 namespace term {
 
-// Mime type of an instrument drag between docks: the wide JSON link text as UTF-8.
-inline constexpr const char* kLinkMimeType = "application/x-marketviews-link";
-// Mime type carrying the dragging view's class name.
-inline constexpr const char* kSourceMimeType = "application/x-marketviews-source";
+// Mime types of an instrument drag between docks (hostview/DragData.h).
+inline constexpr const char* kLinkMimeType = hv::drag::kLinkMimeType;
+inline constexpr const char* kSourceMimeType = hv::drag::kSourceMimeType;
+
+// A menu text that shows "&" as itself rather than as a mnemonic.
+QString MenuText(QString text);
 
 class ViewDock : public QDockWidget {
   Q_OBJECT

@@ -72,6 +72,7 @@ TerminalApp::TerminalApp(const Options& options, AddonLoader& addon, Store* stor
 
 TerminalApp::~TerminalApp() {
   Shutdown();
+  views::SetLinkHandler(nullptr);
   views::SetBlotter(nullptr);
   views::SetRuntime(nullptr);
 }
@@ -122,6 +123,9 @@ bool TerminalApp::Start(std::string& error) {
   m_log = m_runtime->LogFactory().CreateLogger();
   m_blotter = std::make_unique<views::Blotter>(m_store, m_runtime->Market().DateText());
   views::SetBlotter(m_blotter.get());
+  views::SetLinkHandler([this](std::int64_t productId, const std::string& code, CSuperBaseView* from) {
+    LinkInstrument(productId, code, from);
+  });
 
   // Instruments named on the command line must exist: a timed run stops
   // before it starts, a window opens the view without one and says why.
@@ -251,6 +255,21 @@ void TerminalApp::DeliverLink(CSuperBaseView* view, std::int64_t productId, cons
   vl.className = hv::Widen(m_runtime->ClassNameOf(view));
   vl.link = &link;
   view->OnHostMessage(hm::LinkData, ToLParam(&vl));
+}
+
+void TerminalApp::LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from) {
+  // The add-on's single-instrument views decide themselves whether they follow.
+  m_runtime->LinkInstrument(productId, code);
+  // The terminal's chart, analytics and news follow.
+  const std::wstring text = hv::Widen("{\"type\":\"instrument view\",\"data\":[{\"Field_product_id\":\"" +
+                                      std::to_string(productId) + "\",\"Field_instrument_code\":\"" +
+                                      JsonEscape(code) + "\"}]}");
+  for (ViewDock* d : m_window->Docks()) {
+    CSuperBaseView* v = d->View();
+    const QString cls = d->ClassName();
+    if (v != from && (cls == "CBranticChartView" || cls == "CStockAnalytics" || cls == "CFNews"))
+      v->OnHostMessage(hm::LinkedInstrument, ToLParam(&text));
+  }
 }
 
 void TerminalApp::OnActivation(CSuperBaseView* view, bool active) {

@@ -46,6 +46,9 @@ class TerminalApp : public QObject, public IHostShell {
   int RunTimed();
   // Moves the market to `now`, delivers what changed and fills working orders.
   void Pump(std::uint32_t now);
+  // Shows an instrument in the linked views: the add-on's single-instrument
+  // views (615) and the terminal's chart, analytics and news (not `from`).
+  void LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from);
   // Saves the layout and closes every view (idempotent).
   void Shutdown();
   // Ends a timed run early (after the current step) or the event loop (SIGINT, SIGTERM).

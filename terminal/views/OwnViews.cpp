@@ -24,7 +24,10 @@
 #include <QValueAxis>
 #include <QVBoxLayout>
 #include <cmath>
+#include <map>
 
+#include "hostview/DragData.h"
+#include "hostview/StyleRoles.h"
 #include "terminal/host/HostRuntime.h"
 #include "terminal/sim/Market.h"
 #include "terminal/views/Blotter.h"
@@ -56,6 +59,12 @@ QString JsonEscape(const std::string& s) {
     else out += c;
   }
   return out;
+}
+
+QString SectorName(const sim::Market& m, const std::string& code) {
+  for (const auto& s : m.Sectors())
+    if (s.sectorCode == code) return QString::fromStdString(s.sectorName);
+  return code.empty() ? QStringLiteral("-") : QString::fromStdString(code);
 }
 
 QTableWidget* MakeTable(const QStringList& headings, QWidget* parent) {
@@ -263,29 +272,61 @@ void CChartView::Build() {
   chart->legend()->hide();
   m_series = new QLineSeries;
   chart->addSeries(m_series);
-  m_axisX = new QValueAxis;
-  m_axisX->setTitleText("minutes into the session");
-  m_axisX->setLabelFormat("%.0f");
+  m_axisX = new QDateTimeAxis;
+  m_axisX->setFormat("HH:mm");
+  m_axisX->setTickCount(7);
   m_axisY = new QValueAxis;
+  m_axisY->setTickType(QValueAxis::TicksDynamic);
   chart->addAxis(m_axisX, Qt::AlignBottom);
-  chart->addAxis(m_axisY, Qt::AlignLeft);
+  chart->addAxis(m_axisY, Qt::AlignRight);
   m_series->attachAxis(m_axisX);
   m_series->attachAxis(m_axisY);
   m_view = new QChartView(chart, this);
   m_view->setRenderHint(QPainter::Antialiasing);
-  m_empty = new QLabel("No instrument. Open the chart from a price view row.", this);
+  m_empty = new QLabel("No instrument. Drop one here from the explorer or a price view, or open the chart from a "
+                       "price view row.",
+                       this);
   m_empty->setAlignment(Qt::AlignCenter);
+  m_empty->setWordWrap(true);
   layout->addWidget(m_empty);
   layout->addWidget(m_view, 1);
 }
 
 int CChartView::pointCount() const { return m_series ? static_cast<int>(m_series->count()) : 0; }
 
+void CChartView::ChangeStyle(int styleId) {
+  CTerminalView::ChangeStyle(styleId);
+  if (!m_view || !m_pStyleManager) return;
+  const bool dark = styleId == 2;
+  QChart* chart = m_view->chart();
+  chart->setTheme(dark ? QChart::ChartThemeDark : QChart::ChartThemeLight);
+  chart->legend()->hide();
+  chart->setBackgroundBrush(m_pStyleManager->Color(hv::style::kWindowBackground));
+  chart->setTitleBrush(m_pStyleManager->Color(hv::style::kWindowText));
+  for (QAbstractAxis* axis : {static_cast<QAbstractAxis*>(m_axisX), static_cast<QAbstractAxis*>(m_axisY)}) {
+    axis->setLabelsColor(m_pStyleManager->Color(hv::style::kWindowText));
+    axis->setGridLineColor(m_pStyleManager->Color(104));
+  }
+  m_series->setColor(m_pStyleManager->Color(hv::style::kLinkText));
+  m_view->setBackgroundBrush(m_pStyleManager->Color(hv::style::kWindowBackground));
+}
+
 void CChartView::InstrumentChanged() {
   m_tradesShown = static_cast<std::size_t>(-1);
   m_empty->setVisible(m_instrument < 0);
   m_view->setVisible(m_instrument >= 0);
   m_view->chart()->setTitle(InstrumentLabel());
+}
+
+// A round step for about `ticks` price labels: 1, 2, 2.5 or 5 times a power of
+// ten, never finer than the instrument's own price step.
+static double NicePriceStep(double range, int ticks, double minStep) {
+  const double rough = std::max(range / std::max(1, ticks), 1e-9);
+  const double power = std::pow(10.0, std::floor(std::log10(rough)));
+  double step = power * 10;
+  for (double m : {1.0, 2.0, 2.5, 5.0})
+    if (power * m >= rough) { step = power * m; break; }
+  return std::max(step, minStep);
 }
 
 void CChartView::Refresh() {
@@ -295,31 +336,46 @@ void CChartView::Refresh() {
     return;
   }
   const auto& trades = m->Trades(m_instrument);
-  if (trades.size() == m_tradesShown) return;
+  // Times of day on the session's date, as the axis shows them.
+  const QDate day = QDate::fromString(QString::fromStdString(m->DateText()), Qt::ISODate);
+  const qint64 midnight = QDateTime(day, QTime(0, 0)).toMSecsSinceEpoch();
+  auto x = [&](std::uint32_t timeMs) { return static_cast<double>(midnight + timeMs); };
+  const double now = x(m->TimeOfDayMs());
+  if (trades.size() == m_tradesShown) {
+    // No trade since: the time axis still runs on to now.
+    if (m_series->count() > 0)
+      m_axisX->setMax(QDateTime::fromMSecsSinceEpoch(static_cast<qint64>(std::max(now, m_series->at(0).x() + 60000))));
+    return;
+  }
   m_tradesShown = trades.size();
-  const double start = m->Config().sessionStartSeconds * 1000.0;
   QList<QPointF> points;
-  double lo = 0, hi = 0;
   // At most ~800 points: every k-th trade, always the newest.
   const std::size_t step = std::max<std::size_t>(1, trades.size() / 800);
-  for (std::size_t i = 0; i < trades.size(); i += step) {
-    const auto& t = trades[i];
-    points.append(QPointF((t.timeMs - start) / 60000.0, t.price));
-  }
+  for (std::size_t i = 0; i < trades.size(); i += step) points.append(QPointF(x(trades[i].timeMs), trades[i].price));
   if (!trades.empty() && (trades.size() - 1) % step != 0)
-    points.append(QPointF((trades.back().timeMs - start) / 60000.0, trades.back().price));
+    points.append(QPointF(x(trades.back().timeMs), trades.back().price));
   if (points.isEmpty()) {
     const auto& q = m->QuoteOf(m_instrument);
-    if (q.close > 0) points.append(QPointF(0, q.close));
+    if (q.close > 0) points.append(QPointF(now, q.close));
   }
+  double lo = 0, hi = 0;
   for (const auto& p : points) {
     lo = lo == 0 ? p.y() : std::min(lo, p.y());
     hi = std::max(hi, p.y());
   }
   m_series->replace(points);
-  const double pad = std::max((hi - lo) * 0.05, hi * 0.001);
-  m_axisY->setRange(lo - pad, hi + pad);
-  m_axisX->setRange(0, std::max(1.0, points.isEmpty() ? 1.0 : points.back().x()));
+  const auto* ins = InstrumentAt(m_instrument);
+  const double tick = ins ? m->StepAt(ins->priceStepTableId, hi > 0 ? hi : 1.0) : 0.01;
+  const double priceStep = NicePriceStep(std::max(hi - lo, tick), 5, tick);
+  const double bottom = std::floor(lo / priceStep) * priceStep, top = std::ceil(hi / priceStep) * priceStep;
+  m_axisY->setRange(bottom, top > bottom ? top : bottom + priceStep);
+  m_axisY->setTickAnchor(bottom);
+  m_axisY->setTickInterval(priceStep);
+  const int decimals = std::clamp(static_cast<int>(std::ceil(-std::log10(priceStep) - 1e-9)), 0, 6);
+  m_axisY->setLabelFormat(QString("%.%1f").arg(decimals));
+  const double first = points.isEmpty() ? now - 60000 : points.front().x();
+  m_axisX->setRange(QDateTime::fromMSecsSinceEpoch(static_cast<qint64>(first)),
+                    QDateTime::fromMSecsSinceEpoch(static_cast<qint64>(std::max(now, first + 60000))));
 }
 
 // ---- Instrument explorer ----------------------------------------------------
@@ -327,7 +383,8 @@ void CChartView::Refresh() {
 void CExplorerView::Build() {
   auto* layout = new QVBoxLayout(this);
   m_search = new QLineEdit(this);
-  m_search->setPlaceholderText("Search code or name");
+  m_search->setObjectName("search");
+  m_search->setPlaceholderText("Search by code, symbol or name");
   m_search->setClearButtonEnabled(true);
   m_count = new QLabel(this);
   auto* top = new QHBoxLayout;
@@ -341,19 +398,18 @@ void CExplorerView::Build() {
   m_table->verticalHeader()->hide();
   m_table->setEditTriggers(QAbstractItemView::NoEditTriggers);
   m_table->setSelectionBehavior(QAbstractItemView::SelectRows);
-  m_table->horizontalHeader()->setStretchLastSection(true);
+  m_table->setWordWrap(false);
+  m_table->horizontalHeader()->setSectionResizeMode(QHeaderView::ResizeToContents);
+  m_table->horizontalHeader()->setSectionResizeMode(3, QHeaderView::Stretch);
   m_table->viewport()->installEventFilter(this);
   layout->addWidget(m_table, 1);
-  auto* hint = new QLabel("Drag instruments onto a watchlist of the price view; double-click to link them.", this);
+  auto* hint = new QLabel("Double-click an instrument to show it in the linked views. Drag instruments onto a "
+                          "watchlist of the price view, or one onto a chart, analytics or news.",
+                          this);
   hint->setWordWrap(true);
   layout->addWidget(hint);
   connect(m_search, &QLineEdit::textChanged, this, [this](const QString& t) { search(t); });
-  connect(m_table, &QTableView::doubleClicked, this, [this](const QModelIndex& index) {
-    if (!Runtime()) return;
-    bool ok = false;
-    const qint64 pid = m_model->item(index.row(), 0)->text().toLongLong(&ok);
-    if (ok) Runtime()->LinkInstrument(pid, m_model->item(index.row(), 1)->text().toStdString());
-  });
+  connect(m_table, &QTableView::doubleClicked, this, [this](const QModelIndex& index) { linkRow(index.row()); });
   search({});
 }
 
@@ -372,20 +428,38 @@ void CExplorerView::search(const QString& text) {
     const QString code = QString::fromStdString(ins.instrumentCode);
     const QString display = QString::fromStdString(ins.displayCode);
     const QString name = QString::fromStdString(ins.instrumentName);
+    const QString symbol = QString::fromStdString(ins.symbol);
     if (!needle.isEmpty() && !code.contains(needle, Qt::CaseInsensitive) &&
-        !display.contains(needle, Qt::CaseInsensitive) && !name.contains(needle, Qt::CaseInsensitive))
+        !display.contains(needle, Qt::CaseInsensitive) && !symbol.contains(needle, Qt::CaseInsensitive) &&
+        !name.contains(needle, Qt::CaseInsensitive))
       continue;
     if (++matches > kLimit) continue;
     QList<QStandardItem*> row;
     row << new QStandardItem(QString::number(ins.productId)) << new QStandardItem(code)
         << new QStandardItem(QString::fromStdString(ins.exchangeCode)) << new QStandardItem(name)
-        << new QStandardItem(QString::fromStdString(ins.productType));
+        << new QStandardItem(TypeName(ins.productType));
     m_model->appendRow(row);
   }
   m_count->setText(matches > kLimit ? QString("%1 of %2").arg(kLimit).arg(matches) : QString::number(matches));
 }
 
 int CExplorerView::resultCount() const { return m_model ? m_model->rowCount() : 0; }
+
+void CExplorerView::linkRow(int row) {
+  if (row < 0 || row >= m_model->rowCount()) return;
+  bool ok = false;
+  const qint64 pid = m_model->item(row, 0)->text().toLongLong(&ok);
+  if (ok) LinkInstrument(pid, m_model->item(row, 1)->text().toStdString(), this);
+}
+
+QString CExplorerView::TypeName(const std::string& productType) {
+  static const std::map<std::string, QString> names = {
+      {"ES", "Stock"}, {"IDX", "Index"}, {"FUT", "Future"}, {"FX", "Currency"},
+      {"CFD", "CFD"},  {"DMA", "DMA"},   {"CS", "Cash"},
+  };
+  const auto it = names.find(productType);
+  return it == names.end() ? QString::fromStdString(productType) : it->second;
+}
 
 bool CExplorerView::eventFilter(QObject* watched, QEvent* event) {
   if (watched == m_table->viewport()) {
@@ -417,8 +491,8 @@ void CExplorerView::StartDrag() {
   const QString link = QString("{\"type\":\"%1\",\"data\":[%2]}")
                            .arg(rows.size() > 1 ? "instrument view multiple" : "instrument view", objects.join(','));
   auto* mime = new QMimeData;
-  mime->setData("application/x-marketviews-link", link.toUtf8());
-  mime->setData("application/x-marketviews-source", QByteArray("CInsExpViewEx"));
+  mime->setData(hv::drag::kLinkMimeType, link.toUtf8());
+  mime->setData(hv::drag::kSourceMimeType, QByteArray("CInsExpViewEx"));
   mime->setText(link);
   auto* drag = new QDrag(this);
   drag->setMimeData(mime);
@@ -454,8 +528,8 @@ void CAnalyticsView::Refresh() {
       {"Instrument", QString::fromStdString(ins->displayCode.empty() ? ins->instrumentCode : ins->displayCode)},
       {"Name", QString::fromStdString(ins->instrumentName)},
       {"Exchange", QString::fromStdString(ins->exchangeCode)},
-      {"Product type", QString::fromStdString(ins->productType)},
-      {"Sector", QString::fromStdString(ins->sector)},
+      {"Product type", CExplorerView::TypeName(ins->productType)},
+      {"Sector", SectorName(*m, ins->sector)},
       {"Currency", QString::fromStdString(ins->currency)},
       {"Lot size", Grouped(ins->lotSize)},
       {"Last", Price(m_instrument, q.last)},

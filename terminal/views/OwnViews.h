@@ -69,8 +69,10 @@ class CChartView : public CTerminalView {
   QString Caption() const override { return NameFor("CBranticChartView"); }
   // Number of points drawn (tests).
   Q_INVOKABLE int pointCount() const;
+  void ChangeStyle(int styleId) override;
 
  protected:
+  bool TakesInstrumentDrops() const override { return true; }
   void Build() override;
   void Refresh() override;
   void InstrumentChanged() override;
@@ -78,13 +80,15 @@ class CChartView : public CTerminalView {
  private:
   QChartView* m_view = nullptr;
   QLineSeries* m_series = nullptr;
-  QValueAxis* m_axisX = nullptr;
-  QValueAxis* m_axisY = nullptr;
+  QDateTimeAxis* m_axisX = nullptr;  // time of day
+  QValueAxis* m_axisY = nullptr;     // price, in round steps
   QLabel* m_empty = nullptr;
   std::size_t m_tradesShown = 0;
 };
 
-// Instrument explorer: search by code or name, drag rows into a watchlist.
+// Instrument explorer: search by code, symbol or name; double-click shows an
+// instrument in the linked views; rows drag onto a watchlist, a chart,
+// analytics or news.
 class CExplorerView : public CTerminalView {
   Q_OBJECT
  public:
@@ -92,8 +96,13 @@ class CExplorerView : public CTerminalView {
   // Searches as if typed (tests and scripts).
   Q_INVOKABLE void search(const QString& text);
   Q_INVOKABLE int resultCount() const;
+  // What a double-click on result `row` does.
+  Q_INVOKABLE void linkRow(int row);
+  // What the Type column reads for a product type ("Index" for "IDX").
+  static QString TypeName(const std::string& productType);
 
  protected:
+  bool WatchesInstrument() const override { return false; }
   void Build() override;
   void Refresh() override {}
   UINT RefreshInterval() const override { return 0; }
@@ -115,6 +124,7 @@ class CAnalyticsView : public CTerminalView {
   QString Caption() const override { return NameFor("CStockAnalytics"); }
 
  protected:
+  bool TakesInstrumentDrops() const override { return true; }
   void Build() override;
   void Refresh() override;
 
@@ -130,6 +140,7 @@ class CNewsView : public CTerminalView {
   QString Caption() const override { return NameFor("CFNews"); }
 
  protected:
+  bool TakesInstrumentDrops() const override { return true; }
   void Build() override;
   void Refresh() override;
   void InstrumentChanged() override;

@@ -16,6 +16,7 @@ namespace term::views {
 
 namespace {
 HostRuntime* g_runtime = nullptr;
+LinkHandler g_linkHandler;
 constexpr UINT kRefreshTimer = 1;
 
 template <typename T>
@@ -31,6 +32,10 @@ const CRuntimeClass kClasses[] = {
 }  // namespace
 
 void SetRuntime(HostRuntime* runtime) { g_runtime = runtime; }
+void SetLinkHandler(LinkHandler handler) { g_linkHandler = std::move(handler); }
+void LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from) {
+  if (g_linkHandler) g_linkHandler(productId, code, from);
+}
 HostRuntime* Runtime() { return g_runtime; }
 
 QStringList ClassNames() {
@@ -62,11 +67,17 @@ std::map<std::string, std::string> ParseLink(const std::wstring& text) {
 
 CTerminalView::CTerminalView() = default;
 
+CTerminalView::~CTerminalView() {
+  if (m_watched >= 0 && Runtime()) Runtime()->Market().RemoveInterest(m_watched);
+}
+
 int CTerminalView::OnCreate() {
   Build();
   // A restored view starts on the instrument of its start parameters.
-  if (Runtime() && GetStartProductId() >= 0 && !GetStartInstrumentCode().empty())
+  if (Runtime() && GetStartProductId() >= 0 && !GetStartInstrumentCode().empty()) {
     m_instrument = Runtime()->Market().Find(GetStartProductId(), GetStartInstrumentCode());
+    if (m_instrument >= 0 && WatchesInstrument()) Runtime()->Market().AddInterest(m_watched = m_instrument);
+  }
   ChangeStyle(GetStyleID());
   return 0;
 }
@@ -102,16 +113,7 @@ std::uint32_t CTerminalView::OnHostMessage(UINT message, LPARAM data) {
     }
     case hm::LinkedInstrument: {
       const auto* text = FromLParam<const std::wstring>(data);
-      if (!text || !Runtime()) return 0;
-      const auto fields = ParseLink(*text);
-      const auto pid = fields.find("Field_product_id");
-      const auto code = fields.find("Field_instrument_code");
-      if (pid == fields.end() || code == fields.end()) return 0;
-      try {
-        const int index = Runtime()->Market().Find(std::stoll(pid->second), code->second);
-        if (index >= 0) ShowInstrument(index);
-      } catch (const std::exception&) {
-      }
+      if (text) ShowLinked(*text);
       return 0;
     }
     default:
@@ -119,8 +121,37 @@ std::uint32_t CTerminalView::OnHostMessage(UINT message, LPARAM data) {
   }
 }
 
+bool CTerminalView::ShowLinked(const std::wstring& linkText) {
+  if (!Runtime()) return false;
+  const auto fields = ParseLink(linkText);
+  const auto pid = fields.find("Field_product_id");
+  const auto code = fields.find("Field_instrument_code");
+  if (pid == fields.end() || code == fields.end()) return false;
+  try {
+    const int index = Runtime()->Market().Find(std::stoll(pid->second), code->second);
+    if (index < 0) return false;
+    ShowInstrument(index);
+    return true;
+  } catch (const std::exception&) {
+    return false;
+  }
+}
+
+LRESULT CTerminalView::DoDragDrop(UINT message, LPARAM data) {
+  // A drop arrives as a ViewLink naming the source; the first instrument of its link counts.
+  const auto* link = message == hm::LinkData ? FromLParam<const ViewLink>(data) : nullptr;
+  if (!TakesInstrumentDrops() || !link || !link->link) return 0;
+  return ShowLinked(*link->link) ? 1 : 0;
+}
+
 void CTerminalView::ShowInstrument(int index) {
   m_instrument = index;
+  const int watch = WatchesInstrument() ? index : -1;
+  if (Runtime() && watch != m_watched) {
+    if (m_watched >= 0) Runtime()->Market().RemoveInterest(m_watched);
+    if (watch >= 0) Runtime()->Market().AddInterest(watch);
+    m_watched = watch;
+  }
   if (Runtime() && index >= 0) {
     const auto& ins = Runtime()->Market().Instruments()[static_cast<std::size_t>(index)];
     SetStartParam(ins.productId, ins.instrumentCode, GetStartParams());
