@@ -765,7 +765,8 @@ std::int64_t Market::Impl::DrawnSize(int b, double price, int level, int side) c
   if (price <= 0) return 0;
   const std::uint64_t key = std::uint64_t(std::llround(price * 10000.0)) * 4 + std::uint64_t(side);
   const std::uint64_t h = Mix(StreamSeed(config.seed, std::uint64_t(b), key));
-  return (1 + std::int64_t(h % std::uint64_t(40 + 12 * level))) * info[b].lot;
+  // Resting size is a good many of the usual trades, so most trades leave the best level standing.
+  return (8 + std::int64_t(h % std::uint64_t(60 + 12 * level))) * info[b].lot;
 }
 
 std::int32_t Market::Impl::DrawnOrders(int b, std::int64_t size, int level, int side) const {
@@ -868,7 +869,11 @@ void Market::Impl::Event(int i, Rng& r) {
     t.volume = std::int32_t(std::min<std::int64_t>(volume, std::numeric_limits<std::int32_t>::max()));
     t.side = buy ? 1 : 2;
     best.size -= t.volume;
-    if (best.size <= 0) {
+    if (best.size <= 0 && r.Chance(0.5)) {
+      // Often the taken level is refilled at once (hidden size, a quick new order).
+      best.size = lot * r.Range(5, 40);
+      best.orders = 1;
+    } else if (best.size <= 0) {
       side.erase(side.begin());
     } else {
       best.orders = std::int32_t(std::clamp<std::int64_t>(best.orders - 1, 1, best.size / lot));
@@ -887,7 +892,7 @@ void Market::Impl::Event(int i, Rng& r) {
     } else {
       changeSize(leanSide ? book.bids : book.asks, 0, true);
     }
-  } else if (u < 0.405) {
+  } else if (u < 0.398) {
     // The best level on the side the market leans away from is withdrawn.
     std::vector<Level>& side = leanSide ? book.asks : book.bids;
     if (side.size() > 1) side.erase(side.begin());
