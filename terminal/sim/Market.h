@@ -4,7 +4,10 @@
 // Reference data (products, exchanges, instruments, price-step tables, sectors)
 // is generated once from the seed. Prices follow a seeded random walk per
 // instrument; quotes, a 99-level book, the trade tape and the trade summary
-// stay coherent with each other. Time moves only through AdvanceTo(tick), in
+// stay coherent with each other. The book changes as real ones do: most
+// updates change the size at one of the top levels, the best price moves now
+// and then, and trades take liquidity at the best price. Indices tick a value
+// and have no book. Time moves only through AdvanceTo(tick), in
 // fixed steps of `kStepMs`, so the same seed and the same sequence of ticks
 // (and of interest changes) give the same market.
 //
@@ -109,11 +112,14 @@ class Market {
   const JExchangeList* FindExchange(std::string_view code) const;
   const JProduct* FindProduct(std::int64_t productId) const;
   JMarketInfo MarketInfo(std::string_view exchangeCode) const;
+  // The busiest tradeable stock of the home exchange (what a first start shows).
+  int LiquidStock() const;
   // The step at `price` in `tableId` (table 0 when the table has no band there).
   double StepAt(std::int32_t tableId, double price, bool up = true) const;
 
   // ---- Time ----------------------------------------------------------------------
-  // Runs every whole step up to `now` (unsigned tick difference from the last).
+  // Runs every whole step up to `now` (unsigned tick difference from the last);
+  // what is left of a partial step counts towards the next call.
   void AdvanceTo(std::uint32_t now);
   std::uint32_t Now() const;
   // Session clock: "YYYY-MM-DD", "HH:MM:SS", milliseconds since midnight.

@@ -21,7 +21,7 @@ namespace term {
 
 struct StoreOpenReport {
   enum class Outcome {
-    Opened,           // an existing database, in use
+    Opened,           // an existing database, in use (brought up to this terminal's format when older)
     Created,          // no database yet; a new one was made
     ReplacedCorrupt,  // the old one was unreadable; set aside, new one made
     ReplacedNewer,    // the old one came from a newer terminal; set aside, new one made
@@ -30,6 +30,7 @@ struct StoreOpenReport {
   std::filesystem::path path;          // the database in use
   std::filesystem::path setAsidePath;  // where the old database went (Replaced*)
   std::string message;                 // one line for the user (empty when Opened/Created)
+  int upgradedFrom = 0;                // format of an older database brought up to date (0: none)
 };
 
 // One watchlist as the terminal keeps it. `body` is the terminal's own text
@@ -69,6 +70,19 @@ struct SavedView {
   std::map<std::string, std::string> params;  // start parameters, UTF-8
 };
 
+// One order of the blotter. `number` is the order number the user reads (unique).
+struct OrderRow {
+  std::int64_t number = 0;
+  std::string session;  // trading day "YYYY-MM-DD" it was placed on
+  std::string time;     // "HH:MM:SS" market time
+  std::string side;     // "Buy", "Sell"
+  std::int64_t productId = 0;
+  std::string instrumentCode;
+  std::int64_t quantity = 0;
+  double price = 0;
+  std::string type, validity, trigger, status;
+};
+
 struct SavedLayout {
   std::vector<SavedView> views;
   std::string windowGeometry;  // opaque bytes from the main window
@@ -79,8 +93,8 @@ struct SavedLayout {
 
 class Store {
  public:
-  // Format 1 is the first; each later format is one step of Migrate().
-  static constexpr int kSchemaVersion = 2;
+  // 1: settings, watchlists, alerts, layout. 2: the blotter's orders. 3: alert firings.
+  static constexpr int kSchemaVersion = 3;
   static constexpr const char* kFileName = "terminal.db";
 
   // $XDG_DATA_HOME/marketviews-terminal, or ~/.local/share/marketviews-terminal.
@@ -126,11 +140,15 @@ class Store {
   SavedLayout LoadLayout();
   bool SaveLayout(const SavedLayout& layout);
 
+  // The orders of one trading day, by number. Save adds or replaces one order.
+  std::vector<OrderRow> LoadOrders(const std::string& session);
+  bool SaveOrder(const OrderRow& order);
+  // The highest order number ever saved (0 when none): numbers are never reused.
+  std::int64_t LastOrderNumber();
+
  private:
   explicit Store(sqlite3* db, std::filesystem::path path) : m_db(db), m_path(std::move(path)) {}
   bool Exec(const char* sql);
-  // Brings a database of an older format up to kSchemaVersion, keeping its data.
-  bool Migrate(std::string& error);
   int UserVersion();
   bool Fail(const char* what);
   bool MarkSaved(const std::string& set);

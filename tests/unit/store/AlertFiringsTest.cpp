@@ -64,7 +64,7 @@ TEST(StoreAlertFirings, FirstFormatDatabaseIsBroughtUpKeepingItsData) {
     ASSERT_TRUE(store->SaveSettings({{"ui.style", "2"}}));
   }
   // What the first format looked like: no alert history, format 1.
-  RunSql(db, "DROP TABLE alert_firings; PRAGMA user_version=1;");
+  RunSql(db, "DROP TABLE alert_firings; DROP TABLE orders; PRAGMA user_version=1;");
   ASSERT_EQ(Scalar(db, "PRAGMA user_version"), 1);
 
   StoreOpenReport report;
