@@ -79,6 +79,13 @@ class CSingleInstrumentView : public CAddonView {
   explicit CSingleInstrumentView(const addon::ViewClassInfo& info);
   ~CSingleInstrumentView() override;
 
+  // The class data every single-instrument view shares: products and
+  // instruments asked for first, the instrument views as drop sources; the
+  // title entry, default title and exchange refusal key are the class's own.
+  static addon::ViewClassInfo InstrumentClassInfo(const char* className, const CRuntimeClass* descriptor,
+                                                  int titleEntry, const wchar_t* defaultTitle,
+                                                  const char* refusalKey);
+
   // ---- Registration ----
   // Handed out by the user registry at creation, returned at destruction.
   int RegistrationValue() const { return m_user.Id(); }
@@ -175,6 +182,9 @@ class CSingleInstrumentView : public CAddonView {
   virtual void RestoreColumnMask(const std::wstring& mask) {}
   // The view's own data notifications (410/412, 2600, ...).
   virtual std::uint32_t OnInstrumentViewMessage(UINT message, LPARAM data) { return 0; }
+  // Places what lies below the header (the grid, and what a view draws above
+  // it) in `area`. Default: the grid takes all of it.
+  virtual void LayoutBody(const QRect& area);
 
   // True while the instrument of a 310 (start parameters) is being selected.
   bool SelectingFromStartParams() const { return m_fromStartParams; }
