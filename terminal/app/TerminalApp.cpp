@@ -3,6 +3,8 @@
 #include <QApplication>
 #include <QDir>
 #include <QFile>
+#include <QFileDialog>
+#include <QMessageBox>
 #include <QInputDialog>
 #include <QPalette>
 #include <QPixmap>
@@ -168,6 +170,8 @@ bool TerminalApp::Start(std::string& error) {
   });
   connect(w, &MainWindow::fontSizeRequested, this, &TerminalApp::ShowFontSize);
   connect(w, &MainWindow::settingsRequested, this, &TerminalApp::ShowSettings);
+  connect(w, &MainWindow::exportWatchlistsRequested, this, &TerminalApp::ExportWatchlistsFromMenu);
+  connect(w, &MainWindow::importWatchlistsRequested, this, &TerminalApp::ImportWatchlistsFromMenu);
   connect(w, &MainWindow::saveLayoutRequested, this, [this] {
     if (SaveLayout()) m_window->ShowNotice("Layout saved.");
   });
@@ -370,6 +374,50 @@ void TerminalApp::ShowFontSize() {
   for (CSuperBaseView* v : m_runtime->Views())
     if (m_runtime->ClassNameOf(v) == "CPriceViewAdv") { m_runtime->ShowFontSizeMenu(v); any = true; }
   if (!any) m_window->ShowNotice("Open a price view to change its font size.");
+}
+
+bool TerminalApp::ExportWatchlists(const QString& path, QString* error) {
+  QFile f(path);
+  if (!f.open(QIODevice::WriteOnly | QIODevice::Truncate | QIODevice::Text) ||
+      f.write(QByteArray::fromStdString(m_runtime->ExportWatchlists())) < 0 || !f.flush()) {
+    if (error) *error = QString("Cannot write %1: %2").arg(path, f.errorString());
+    return false;
+  }
+  return true;
+}
+
+QStringList TerminalApp::ImportWatchlists(const QString& path) {
+  QFile f(path);
+  if (!f.open(QIODevice::ReadOnly | QIODevice::Text))
+    return {QString("Cannot read %1: %2").arg(path, f.errorString())};
+  QStringList problems;
+  for (const std::string& p : m_runtime->ImportWatchlists(f.readAll().toStdString()))
+    problems << QString::fromStdString(p);
+  return problems;
+}
+
+void TerminalApp::ExportWatchlistsFromMenu() {
+  const QString path =
+      QFileDialog::getSaveFileName(m_window.get(), "Export watchlists", "watchlists.txt", "Text files (*.txt)");
+  if (path.isEmpty()) return;
+  QString error;
+  if (ExportWatchlists(path, &error)) m_window->ShowNotice("Watchlists exported to " + path + ".");
+  else QMessageBox::warning(m_window.get(), "Export watchlists", error);
+}
+
+void TerminalApp::ImportWatchlistsFromMenu() {
+  const QString path = QFileDialog::getOpenFileName(m_window.get(), "Import watchlists", QString(),
+                                                    "Text files (*.txt);;All files (*)");
+  if (path.isEmpty()) return;
+  const QStringList problems = ImportWatchlists(path);
+  if (problems.isEmpty()) {
+    m_window->ShowNotice("Watchlists imported from " + path + ".");
+    return;
+  }
+  QMessageBox box(QMessageBox::Warning, "Import watchlists",
+                  "Nothing was imported: the file breaks the watchlist rules.", QMessageBox::Ok, m_window.get());
+  box.setDetailedText(problems.join('\n'));
+  box.exec();
 }
 
 void TerminalApp::ShowSettings() {
