@@ -30,8 +30,9 @@ QApplication& App() {
   static int argc = 1;
   static char name[] = "price-restart-test";
   static char* argv[] = {name, nullptr};
-  static QApplication app(argc, argv);
-  return app;
+  // Lives for the process: the add-on stays loaded to the end and keeps Qt objects.
+  static QApplication* app = new QApplication(argc, argv);
+  return *app;
 }
 
 struct TempDir {
