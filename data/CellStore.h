@@ -116,7 +116,9 @@ class CellStore {
 
   // Decodes one field value into the record of `key`. Records are created only
   // by Get: an update for an unknown key is dropped. Returns whether the record
-  // changed. A numeric value that is not a finite number leaves the cell as it was.
+  // changed. An empty (or blank) numeric value reads as 0: the terminal sends it
+  // when it withdraws a price. Any other text that is not a finite number
+  // leaves the cell as it was.
   bool Update(const Key& key, std::wstring_view field, std::wstring_view value, std::uint32_t now);
   bool Update(const Key& key, int fieldIndex, std::wstring_view value, std::uint32_t now);
 
@@ -220,7 +222,7 @@ template <class L>
 bool CellStore<L>::Update(const Key& key, std::wstring_view field, std::wstring_view value, std::uint32_t now) {
   if (field.empty()) return false;
   const int idx = FieldIndex(field);
-  if (idx < 0 && !(L::kEmptyValueTouches && value.empty())) return false;
+  if (idx < 0 && !(L::kEmptyValueTouches && mvd::IsBlank(value))) return false;
   return Update(key, idx, value, now);
 }
 
@@ -233,7 +235,7 @@ bool CellStore<L>::Update(const Key& key, int idx, std::wstring_view value, std:
   Record& r = *it->second;
   if constexpr (L::kEmptyValueTouches) {
     // An empty value withdraws the level's price text and tells the view to repaint.
-    if (value.empty()) {
+    if (mvd::IsBlank(value)) {
       if (idx >= 0 && L::kCells[idx].clearOnEmpty) r.cells[idx].text.clear();
       r.readAt = now;
       Touch(r, now);
@@ -255,7 +257,7 @@ bool CellStore<L>::Decode(Record& r, int idx, std::wstring_view value, std::uint
     c.text.assign(value);
   } else {
     double v = 0.0;
-    if (!mvd::ParseNumber(value, v)) return false;
+    if (!mvd::IsBlank(value) && !mvd::ParseNumber(value, v)) return false;
     if (spec.kind == CellKind::Whole) {
       v = std::trunc(v);
       // Beyond the 64-bit range there is no whole number to show.
