@@ -124,7 +124,10 @@ void CInstrumentComboBox::AttachList(const std::vector<JInstrumentUnderlying>* l
   platform::KillTimer(this, kSearchTimer);
   m_list = list;
   m_products = std::move(productMap);
-  m_index.Clear();
+  // The texts are copied now; the lookup lists are built in the background
+  // while the user has not typed yet.
+  if (list) m_index.StartBuild(*list);
+  else m_index.Clear();
   const int n = list ? int(list->size()) : 0;
   m_added.assign(std::size_t(n), 0);
   m_model->SetSource(list, &m_products);
@@ -289,7 +292,6 @@ void CInstrumentComboBox::RunSearch() {
     found.resize(m_list->size());
     std::iota(found.begin(), found.end(), 0);
   } else if (m_list) {
-    if (!m_index.IsBuilt()) m_index.Build(*m_list);
     found = m_index.Search(key);
   }
   {

@@ -106,7 +106,7 @@ class CInstrumentComboBox : public CSkinComboBox, public platform::TimerHandler 
   const std::vector<JInstrumentUnderlying>* m_list = nullptr;
   std::map<std::int64_t, JProduct> m_products;
   CInstrumentListModel* m_model = nullptr;
-  InstrumentSearchIndex m_index;  // built on the first search after attaching
+  InstrumentSearchIndex m_index;  // started when the list is attached
   std::vector<char> m_added;
   int m_fillPos = 0;
   bool m_filling = false;

@@ -31,47 +31,6 @@ std::vector<std::string> Names(const std::vector<JInstrumentUnderlying>& list, c
   return out;
 }
 
-TEST(InstrumentSearchTest, Search_GroupsComeInOrderNamePrefixSymbolPrefixNameSymbol) {
-  const std::vector<JInstrumentUnderlying> list{
-      Ins("Zed Symbol Contains", "ZAB"), Ins("Xab", "X1"), Ins("Nothing", "N1"), Ins("Prefix Symbol", "AB1"),
-      Ins("Abc", "C1"), Ins("Exchange Only", "E1", "XABX")};
-  InstrumentSearchIndex index;
-  index.Build(list);
-  EXPECT_EQ(Names(list, index.Search("ab")),
-            (std::vector<std::string>{"Abc", "Prefix Symbol", "Xab", "Zed Symbol Contains", "Exchange Only"}));
-  for (std::size_t i = 0; i < list.size(); ++i) {
-    // The index agrees with the one-by-one rule.
-    const auto g = InstrumentSearchIndex::Classify(list[i], "ab");
-    const auto found = index.Search("ab");
-    EXPECT_EQ(g != InstrumentSearchIndex::kNone, std::find(found.begin(), found.end(), int(i)) != found.end()) << i;
-  }
-}
-
-TEST(InstrumentSearchTest, Search_OrderWithinAGroupDependsOnKeyLength) {
-  const std::vector<JInstrumentUnderlying> list{Ins("Abz", "S1"), Ins("xxAb", "S2"), Ins("Aba", "S3"),
-                                                Ins("xAbq", "S4"), Ins("xAba", "S5")};
-  InstrumentSearchIndex index;
-  index.Build(list);
-  // Two letters: name prefix alphabetically, then contains by offset and name.
-  EXPECT_EQ(Names(list, index.Search("ab")), (std::vector<std::string>{"Aba", "Abz", "xAba", "xAbq", "xxAb"}));
-  // One letter: list order inside each group.
-  EXPECT_EQ(Names(list, index.Search("a")), (std::vector<std::string>{"Abz", "Aba", "xxAb", "xAbq", "xAba"}));
-  // Upper-case letters of the data match the lowered key; nothing else is folded.
-  EXPECT_TRUE(index.Search("ABA").empty()) << "the key arrives lowered";
-  EXPECT_EQ(index.Search("").size(), list.size());
-  EXPECT_TRUE(index.Search("zzz").empty());
-}
-
-TEST(InstrumentSearchTest, Search_MatchesNeverSpanTwoInstruments) {
-  const std::vector<JInstrumentUnderlying> list{Ins("ab", "s1"), Ins("cd", "s2"), Ins("", ""), Ins("bc", "s3")};
-  InstrumentSearchIndex index;
-  index.Build(list);
-  EXPECT_TRUE(index.Search("bc").size() == 1u);
-  EXPECT_EQ(index.Search("bc").front(), 3);
-  EXPECT_TRUE(index.Search("abc").empty());
-  EXPECT_EQ(index.Search(std::string("a\0", 2)).size(), 0u);
-}
-
 class FixedLanguage : public ILanguage {
  public:
   std::wstring GetText(int section, int entry) const override {
