@@ -255,13 +255,6 @@ void CInstrumentComboBox::OnTextEdited(const QString& text) {
   ApplyEditColors();
   platform::KillTimer(this, kSearchTimer);
   if (text != m_lastSearch) platform::SetTimer(this, kSearchTimer, kTypingPauseMs);
-  m_typed = true;
-}
-
-void CInstrumentComboBox::showPopup() {
-  m_typedBeforeDrop = m_typed;
-  m_typed = false;
-  CSkinComboBox::showPopup();
 }
 
 void CInstrumentComboBox::OnTimer(UINT id) {
