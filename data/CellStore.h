@@ -23,6 +23,7 @@
 
 #include "data/Keys.h"
 #include "data/NumberText.h"
+#include "data/ProcessState.h"
 
 // Change marks.
 enum : std::int32_t { kMarkNone = 0, kMarkChanged = 1, kMarkUp = 2, kMarkDown = 3 };
@@ -181,6 +182,9 @@ class CellStore {
   // Every key as " [<product id> | <code>]".
   std::wstring Dump() const;
 
+  // Empty, as when first made (tests; see data/ProcessState.h).
+  void ResetForTests();
+
  private:
   Record MakeDefault(const Key& key, std::uint32_t now) const;
   void Touch(Record& r, std::uint32_t now);
@@ -212,7 +216,20 @@ int InstrumentDecimals(const InstrumentKey& key);  // ReferenceStores.cpp
 template <class L>
 CellStore<L>& CellStore<L>::Instance() {
   static CellStore store;
+  static const bool hook = mvd::OnResetForTests([] { store.ResetForTests(); });
+  (void)hook;
   return store;
+}
+
+template <class L>
+void CellStore<L>::ResetForTests() {
+  std::lock_guard lock(mu_);
+  map_.clear();
+  records_.clear();
+  pending_.clear();
+  marked_.clear();
+  changed_.clear();
+  version_.store(0, std::memory_order_release);
 }
 
 template <class L>

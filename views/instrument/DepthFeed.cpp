@@ -3,11 +3,15 @@
 #include <algorithm>
 #include <set>
 
+#include "data/ProcessState.h"
+
 namespace depth {
 namespace {
 
 std::vector<PendingDepth>& Queue() {
   static std::vector<PendingDepth> queue;
+  static const bool hook = mvd::OnResetForTests([] { queue.clear(); });
+  (void)hook;
   return queue;
 }
 

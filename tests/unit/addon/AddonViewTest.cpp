@@ -7,6 +7,7 @@
 #include "addon/AddonView.h"
 #include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
+#include "mvtest/ProcessStateReset.h"
 #include "mvtest/ScriptedHost.h"
 
 namespace {

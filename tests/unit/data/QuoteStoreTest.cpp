@@ -7,6 +7,7 @@
 #include "data/QuoteStore.h"
 #include "data/ReferenceStores.h"
 #include "hostview/Text.h"
+#include "mvtest/ProcessStateReset.h"
 
 namespace {
 
