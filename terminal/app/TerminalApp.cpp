@@ -16,6 +16,7 @@
 #include "platform/Platform.h"
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
+#include "terminal/app/MarketDump.h"
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/SettingsDialog.h"
 #include "terminal/sim/Market.h"
@@ -32,6 +33,7 @@ namespace {
 const QStringList kAddonClasses = {"CPriceViewAdv",   "CMarketDepthAdv",   "CTimeAndSalesAdv",
                                    "CTradeSummaryAdv", "CPriceAlertList",  "CNewPriceAlertAdv"};
 constexpr int kPumpMs = 50;
+constexpr int kViewRefreshMs = 200;  // the views' refresh period
 constexpr double kDefaultHeadlessSeconds = 10;
 constexpr int kAutosaveMs = 60 * 1000;
 
@@ -325,6 +327,13 @@ int TerminalApp::RunTimed() {
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }
+  // One more refresh of every view on the final market (no market step), so
+  // that the views' dumps and the market's describe the same moment.
+  if (!m_shutDown) {
+    clock.Advance(kViewRefreshMs);
+    platform::ProcessPosted();
+    QCoreApplication::processEvents();
+  }
   int code = 0;
   if (!SaveLayout()) code = 1;
   std::string error;
@@ -332,6 +341,7 @@ int TerminalApp::RunTimed() {
     const int n = DumpGrids(m_options.dumpDir, error);
     if (n < 0) { Progress("error: " + error); code = 1; }
     else Progress("wrote " + std::to_string(n) + (n == 1 ? " grid dump to " : " grid dumps to ") + m_options.dumpDir);
+    if (WriteMarketTradeDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
   }
   if (!m_options.snapshotDir.empty()) {
     const int n = Snapshot(m_options.snapshotDir, error);

@@ -9,4 +9,8 @@ class CTradeSummaryAdv : public CSingleInstrumentView {
  public:
   CTradeSummaryAdv();
   ~CTradeSummaryAdv() override;
+
+ protected:
+  void OnActivate() override;
+  void OnDeactivate() override;
 };
