@@ -5,10 +5,12 @@
 #include <QBarSet>
 #include <QChart>
 #include <QChartView>
+#include <QHorizontalBarSeries>
 #include <QCursor>
 #include <QScrollBar>
 #include <QToolTip>
-#include <QVBoxLayout>
+#include <QGridLayout>
+#include <QLocale>
 #include <QValueAxis>
 #include <QWheelEvent>
 #include <algorithm>
@@ -21,17 +23,14 @@ CBarChart::CBarChart(QWidget* parent) : QWidget(parent) {
   m_chart->legend()->setAlignment(Qt::AlignTop);
   m_chart->setMargins(QMargins(4, 4, 4, 4));
   m_chart->setBackgroundRoundness(0);
-  m_bars = new QBarSeries();
-  m_bars->setBarWidth(0.8);
-  m_chart->addSeries(m_bars);
   m_axisX = new QBarCategoryAxis();
   m_axisY = new QValueAxis();
   m_axisY->setLabelFormat(QStringLiteral("%.0f"));
+  // Thousands grouped as in the tables ("100,000").
+  m_chart->setLocale(QLocale(QLocale::English, QLocale::UnitedStates));
+  m_chart->setLocalizeNumbers(true);
   m_axisY->setRange(0, 1);
-  m_chart->addAxis(m_axisX, Qt::AlignBottom);
-  m_chart->addAxis(m_axisY, Qt::AlignLeft);
-  m_bars->attachAxis(m_axisX);
-  m_bars->attachAxis(m_axisY);
+  MakeSeries();
 
   m_view = new QChartView(m_chart, this);
   m_view->setRenderHint(QPainter::Antialiasing, true);
@@ -39,23 +38,110 @@ CBarChart::CBarChart(QWidget* parent) : QWidget(parent) {
   m_scroll = new QScrollBar(Qt::Horizontal, this);
   m_scroll->setRange(0, 0);
   connect(m_scroll, &QScrollBar::valueChanged, this, [this](int v) {
-    if (!m_updatingScroll) SetScrollPos(v);
+    if (!m_updatingScroll) UserScroll(v);
   });
-  auto* layout = new QVBoxLayout(this);
-  layout->setContentsMargins(0, 0, 0, 0);
-  layout->setSpacing(0);
-  layout->addWidget(m_view, 1);
-  layout->addWidget(m_scroll);
+  m_layout = new QGridLayout(this);
+  m_layout->setContentsMargins(0, 0, 0, 0);
+  m_layout->setSpacing(0);
+  m_layout->addWidget(m_view, 0, 0);
+  m_layout->addWidget(m_scroll, 1, 0);
+  SetPalette(m_palette);
+  UpdateScrollBar();
+}
 
+// The bar series of the orientation, with the category axis along the groups
+// and the value axis along the bars.
+void CBarChart::MakeSeries() {
+  if (m_bars) {
+    m_chart->removeSeries(m_bars);
+    delete m_bars;
+    m_bars = nullptr;
+  }
+  for (QAbstractAxis* axis : m_chart->axes()) m_chart->removeAxis(axis);
+  const bool horizontal = m_orientation == Qt::Horizontal;
+  if (horizontal) m_bars = new QHorizontalBarSeries();
+  else m_bars = new QBarSeries();
+  m_bars->setBarWidth(0.8);
+  m_chart->addSeries(m_bars);
+  m_chart->addAxis(m_axisX, horizontal ? Qt::AlignLeft : Qt::AlignBottom);
+  m_chart->addAxis(m_axisY, horizontal ? Qt::AlignBottom : Qt::AlignLeft);
+  m_bars->attachAxis(m_axisX);
+  m_bars->attachAxis(m_axisY);
   // One tooltip per bar group, whichever series' bar the pointer is on.
-  connect(m_bars, &QBarSeries::hovered, this, [this](bool status, int index, QBarSet*) {
-    const auto visible = VisibleGroups();
+  connect(m_bars, &QAbstractBarSeries::hovered, this, [this](bool status, int index, QBarSet*) {
+    const auto visible = DrawnGroups();
     if (status && index >= 0 && index < int(visible.size()))
       QToolTip::showText(QCursor::pos(), TooltipOf(visible[std::size_t(index)]), m_view);
     else
       QToolTip::hideText();
   });
-  UpdateScrollBar();
+}
+
+void CBarChart::SetOrientation(Qt::Orientation orientation) {
+  if (orientation == m_orientation) return;
+  m_orientation = orientation;
+  // The scroll bar runs along the groups: under them or beside them.
+  m_layout->removeWidget(m_scroll);
+  if (orientation == Qt::Horizontal) {
+    m_scroll->setOrientation(Qt::Vertical);
+    m_layout->addWidget(m_scroll, 0, 1);
+  } else {
+    m_scroll->setOrientation(Qt::Horizontal);
+    m_layout->addWidget(m_scroll, 1, 0);
+  }
+  MakeSeries();
+  Rebuild();
+}
+
+void CBarChart::SetPalette(const Palette& palette) {
+  m_palette = palette;
+  m_chart->setBackgroundBrush(palette.back);
+  m_chart->setBackgroundPen(Qt::NoPen);
+  m_chart->setPlotAreaBackgroundVisible(false);
+  m_chart->setTitleBrush(palette.text);
+  m_chart->legend()->setLabelColor(palette.text);
+  for (QAbstractAxis* axis : {static_cast<QAbstractAxis*>(m_axisX), static_cast<QAbstractAxis*>(m_axisY)}) {
+    axis->setLabelsColor(palette.text);
+    axis->setLinePenColor(palette.gridLine);
+    axis->setGridLineColor(palette.gridLine);
+  }
+  if (m_view) {
+    m_view->setBackgroundBrush(palette.back);
+    QPalette p = m_view->palette();
+    p.setColor(QPalette::Window, palette.back);
+    p.setColor(QPalette::Base, palette.back);
+    m_view->setPalette(p);
+  }
+  QPalette own = this->palette();
+  own.setColor(QPalette::Window, palette.back);
+  setPalette(own);
+  setAutoFillBackground(true);
+  update();
+}
+
+QStringList CBarChart::AxisLabels() const { return m_axisX->categories(); }
+
+QString CBarChart::dumpTsv() const {
+  auto clean = [](QString text) { return text.replace('\t', ' ').replace('\r', ' ').replace('\n', ' '); };
+  QStringList head{QString()};
+  for (const Series& s : m_series) head << clean(s.legend);
+  QString out = head.join('\t') + '\n';
+  for (int g : VisibleGroups()) {
+    const Group& group = m_groups[std::size_t(g)];
+    QStringList line{clean(group.label)};
+    for (int s = 0; s < SeriesCount(); ++s) {
+      const double v = std::size_t(s) < group.values.size() ? group.values[std::size_t(s)] : 0.0;
+      line << (std::isfinite(v) ? QString::number(v, 'f', v == std::trunc(v) ? 0 : 6) : QStringLiteral("0"));
+    }
+    out += line.join('\t') + '\n';
+  }
+  return out;
+}
+
+void CBarChart::UserScroll(int first) {
+  const int before = m_first;
+  SetScrollPos(first);
+  if (m_first != before) emit scrollPosChanged(m_first);
 }
 
 CBarChart::~CBarChart() = default;
@@ -139,9 +225,16 @@ void CBarChart::UpdateScrollBar() {
   m_updatingScroll = false;
 }
 
+std::vector<int> CBarChart::DrawnGroups() const {
+  auto groups = VisibleGroups();
+  // Categories run upwards along a vertical axis: the first group belongs at the top.
+  if (m_orientation == Qt::Horizontal) std::reverse(groups.begin(), groups.end());
+  return groups;
+}
+
 void CBarChart::Rebuild() {
   m_bars->clear();  // deletes the old sets
-  const auto visible = VisibleGroups();
+  const auto visible = DrawnGroups();
   double top = 0.0;
   QStringList labels;
   for (int g : visible) labels << m_groups[std::size_t(g)].label;
@@ -175,6 +268,6 @@ void CBarChart::Rebuild() {
 
 void CBarChart::wheelEvent(QWheelEvent* e) {
   const int steps = e->angleDelta().y() / 120;
-  if (steps) SetScrollPos(m_first - steps);
+  if (steps) UserScroll(m_first - steps);
   e->accept();
 }

@@ -166,6 +166,8 @@ class CSingleInstrumentView : public CAddonView {
   virtual void RestoreColumnMask(const std::wstring& mask) {}
   // The view's own data notifications (410/412, 2600, ...).
   virtual std::uint32_t OnInstrumentViewMessage(UINT message, LPARAM data) { return 0; }
+  // The area below the header (and the tab strip). Default: all of it for the grid.
+  virtual void LayoutBody(const QRect& area);
 
   // True while the instrument of a 310 (start parameters) is being selected.
   bool SelectingFromStartParams() const { return m_fromStartParams; }
