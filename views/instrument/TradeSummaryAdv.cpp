@@ -151,8 +151,12 @@ void CTradeSummaryAdv::OnRefreshTick() {
   // 3. Redraw when something moved since the last drawing.
   if (!m_summaryGrid) return;
   const std::uint64_t stamp = m_summaryGrid->NewestStamp();
-  if (stamp == 0 || stamp == m_lastStamp) return;
+  const int filled = m_summaryGrid->FilledLines();
+  // The stamp adds the versions of two stores: a page count that shrinks the
+  // table can lower it, so any difference (or another row count) is news.
+  if (stamp == 0 || (stamp == m_lastStamp && filled == m_lastFilled)) return;
   m_lastStamp = stamp;
+  m_lastFilled = filled;
   bool firstRows = false;
   if (m_summaryGrid->GetNumberRows() > 0) {
     m_summaryGrid->SetMessage({});
@@ -226,6 +230,7 @@ void CTradeSummaryAdv::FollowChart(int first) {
 
 void CTradeSummaryAdv::OnInstrumentSelected(const JInstrumentUnderlying& instrument) {
   m_lastStamp = 0;
+  m_lastFilled = 0;
   m_rowsShown = false;
   m_chartVersion = 0;
   if (m_chart) m_chart->Clear();
@@ -235,6 +240,7 @@ void CTradeSummaryAdv::OnInstrumentSelected(const JInstrumentUnderlying& instrum
 void CTradeSummaryAdv::ShowRefusedColumns() {
   // The table is reset; the chart must not keep the previous instrument's bars.
   m_lastStamp = 0;
+  m_lastFilled = 0;
   m_rowsShown = false;
   if (m_chart) {
     m_chart->Clear();

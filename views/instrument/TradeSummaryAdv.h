@@ -82,6 +82,7 @@ class CTradeSummaryAdv : public CSingleInstrumentView {
   TradeSGrid* m_summaryGrid = nullptr;
   CBarChart* m_chart = nullptr;
   std::uint64_t m_lastStamp = 0;
+  int m_lastFilled = 0;
   bool m_rowsShown = false;         // rows appeared for this instrument (one-shot)
   std::uint64_t m_chartVersion = 0; // newest line version in the chart's window when built
   bool m_wasCurrent = false;
