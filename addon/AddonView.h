@@ -6,10 +6,18 @@
 //     common answers below, everything else -> OnViewMessage(). A null data
 //     word on a pointer-carrying message (addon::IsPointerMessage) and an
 //     unknown number are dropped: they change nothing.
-//   - answers the host gives synchronously while a request is inside
-//     SendChildFeedback: 514/2814 (message text), 515/518 (parameter text into
-//     SettingTextTable), 519 (display mode), 2310 (alternative status). These
-//     handlers only store; they never send.
+//   - synchronous questions: Ask<T>(message, data) sends a request and
+//     returns the answer the host delivers before SendChildFeedback returns,
+//     or nullopt when none came. The question helpers below (514/2814,
+//     515/518, 519, 2310; InstrumentActions: 604; the single-instrument views:
+//     550/551) all go through it. An answer that arrives outside a question
+//     is handled as a notification: 514/2814 keep the last message text, 519
+//     the display mode, 2310 the alternative-status flag; 515/518 name no key
+//     and are dropped. Answer handlers only store; they never send.
+//   - reference lists fill the process-wide stores whichever view receives
+//     them: 500 instruments, 503 exchanges, 505 products, 601 market delays
+//     (first row of the list). The view then sees the message in
+//     OnViewMessage too (to reload its own lists).
 //   - 528: stores the link-mode flag (0 or 1) and echoes it; other values are ignored.
 //   - PrepareBasicData: log, then, the first time a view of this class runs it
 //     in the process, the class's parameter requests and the requests for the
@@ -18,6 +26,9 @@
 //   - logging through the process-wide logger registry under the class name.
 //   - language texts (section 13), the title (101) and message boxes captioned
 //     with the application title.
+//   - instrument actions (Actions(): trade tickets, opening views, access and
+//     exchange checks) and, for the views that turn them on, the six trade
+//     shortcut keys (WatchTradeKeys, ShortcutTicket, OpenTradeTicket).
 //
 // A derived view:
 //   class CMyViewAdv : public CAddonView {
@@ -25,45 +36,31 @@
 //    public:
 //     CMyViewAdv() : CAddonView(Info()) {}
 //    protected:
-//     void OnActivate() override;                      // usually calls PrepareBasicData()
+//     void OnActivate() override { PrepareBasicData(); ... }  // logs this file and line
 //     std::uint32_t OnViewMessage(UINT, LPARAM) override;
 //   };
 //   ADDON_IMPLEMENT_VIEW(CMyViewAdv)   // in the .cpp: the class descriptor
+// and lists its Info() in addon/ViewClasses.cpp.
 //
 // Everything runs on the host's UI thread.
 #include <cstdint>
+#include <functional>
+#include <initializer_list>
 #include <map>
+#include <optional>
+#include <source_location>
 #include <string>
 #include <vector>
 
 #include "addon/Channel.h"
+#include "addon/HostAnswer.h"
+#include "addon/InstrumentActions.h"
 #include "addon/Registries.h"
 #include "addon/StoreStatus.h"
+#include "addon/ViewClasses.h"
 #include "hostview/MessageIds.h"
 #include "hostview/SuperBaseView.h"
 #include "platform/Platform.h"
-
-namespace addon {
-
-// One parameter request of a first PrepareBasicData: 515 or 518 with a key.
-struct SettingRequest {
-  UINT message = hm::SystemParameter;
-  std::string key;
-};
-
-// What distinguishes one view class in the shared behaviour. A static object
-// per class; the base keeps a reference.
-struct ViewClassInfo {
-  const char* className = "";       // as registered ("CMarketDepthAdv")
-  const char* sourceFile = "";      // named in the PrepareBasicData log lines
-  int titleEntry = 0;               // language entry (section 13) of the title; 0: none
-  const wchar_t* defaultTitle = L"";  // the title when the language gives no text
-  // Sent the first time a view of the class prepares its data, in this order:
-  std::vector<SettingRequest> firstSettings;
-  std::vector<RefStore> firstStores;  // each only when not loaded
-};
-
-}  // namespace addon
 
 class CAddonView : public CSuperBaseView, public platform::TimerHandler, public platform::MessageTarget {
   Q_OBJECT
@@ -94,10 +91,23 @@ class CAddonView : public CSuperBaseView, public platform::TimerHandler, public 
   const std::wstring& LastMessageText() const { return m_lastMessageText; }
   bool IsActive() const { return m_active; }
 
-  // ---- Requests with synchronous answers ----
+  // ---- Synchronous questions ----
+  // Sends `message` with `data` and returns the answer the host delivers
+  // while the request is inside SendChildFeedback: a message whose number is
+  // in `answers` (default: `message` itself), its data word read as a T (see
+  // addon/HostAnswer.h). nullopt when no answer came (or the word carried
+  // none). When several answers come, the last counts. The answer is taken by
+  // the question only: OnViewMessage does not see it. Questions may nest.
+  template <class T>
+  std::optional<T> Ask(UINT message, LPARAM data, std::initializer_list<UINT> answers = {}) {
+    std::optional<T> answer;
+    AskHost(message, data, answers, [&answer](LPARAM word) { answer = addon::HostAnswer<T>::Read(word); });
+    return answer;
+  }
+
   // The display text of a message code: key "<code>, <number>"; served from
-  // this view's cache, else asked with 2814; the key itself when the host has
-  // no text (not cached).
+  // this view's cache, else asked with 2814 (answered with 514 or 2814); the
+  // key itself when the host has no text (not cached).
   std::wstring LookupMessageText(const std::string& code, std::int64_t number = 0);
   // Asks 514 with `key` and returns the answer (empty when none). Not cached.
   std::wstring RequestTextByKey(const std::string& key);
@@ -109,6 +119,13 @@ class CAddonView : public CSuperBaseView, public platform::TimerHandler, public 
   int QueryDisplayMode();
   // Clears the alternative-status flag, asks 2310 and returns the flag.
   bool QueryAltStatus();
+
+  // ---- Instrument actions ----
+  addon::InstrumentActions& Actions() { return m_actions; }
+  // A trade ticket (MSG_WLOPENTRADE and the shortcut keys). Default: the
+  // shared path with no access check; the single-instrument views refuse an
+  // instrument that is not tradeable first.
+  virtual LRESULT OpenTradeTicket(const std::wstring* linkText, LPARAM origin);
 
   // ---- Helpers ----
   // This view's SendChildFeedback as a sender for the field batch helpers.
@@ -126,12 +143,17 @@ class CAddonView : public CSuperBaseView, public platform::TimerHandler, public 
   int ShowMessageText(const std::string& code, std::int64_t number = 0);
   // Logs "Info:<function> file:<file> line:<line>" under this view's class.
   void LogInfo(const char* function, const char* file, int line) const;
+  // The same for the code that calls it: its qualified function name, its
+  // source file name and its line.
+  void LogHere(std::source_location where = std::source_location::current()) const;
   void LogLine(const char* format, ...) const __attribute__((format(printf, 2, 3)));
   // The log factory's logger registered under this view's class (once per view).
   void RegisterLogger();
 
-  // Runs the start-up data steps (see the file comment).
-  void PrepareBasicData();
+  // Runs the start-up data steps (see the file comment). The log lines name
+  // "<class>::PrepareBasicData" with the file and line of the call, so a view
+  // calls it from its own source file.
+  void PrepareBasicData(std::source_location where = std::source_location::current());
   // Whether the class's first PrepareBasicData has run in this process.
   static bool HasPreparedClass(const std::string& className);
 
@@ -139,24 +161,49 @@ class CAddonView : public CSuperBaseView, public platform::TimerHandler, public 
   // Message 2 / 1. Defaults: PrepareBasicData, plus the active flag.
   virtual void OnActivate();
   virtual void OnDeactivate();
-  // Every message the base does not handle. Default: 0, nothing changes.
+  // Every message the base does not handle, and the lists it filed. Default:
+  // 0, nothing changes.
   virtual std::uint32_t OnViewMessage(UINT message, LPARAM data) { return 0; }
   // Sends the request 102 with a preferred size.
   void SendViewSize(int width, int height);
   void SetActiveFlag(bool active) { m_active = active; }
 
+  // ---- Trade shortcut keys (off unless a view watches them) ----
+  // Takes the six trade keys pressed in `widget` (the view itself, a grid, a
+  // search box) before any other shortcut of the terminal. In a `textEntry`
+  // widget the main-keyboard plus, equals and minus stay text; the keypad and
+  // function keys still trade. A key is consumed whether or not a ticket
+  // opens; a ticket opens only while the host's shortcut setting is on and
+  // ShortcutTicket gives a text, with origin 99.
+  void WatchTradeKeys(QWidget* widget, bool textEntry = false);
+  // The JSON text of the ticket a shortcut opens; nullopt: none (no instrument).
+  virtual std::optional<std::wstring> ShortcutTicket(addon::TradeSide side) { return std::nullopt; }
+  // One key: true when it is a trade key and was consumed.
+  bool HandleTradeKey(int key, Qt::KeyboardModifiers modifiers, bool inTextEntry = false);
+
+  bool eventFilter(QObject* watched, QEvent* event) override;
+  void keyPressEvent(QKeyEvent* e) override;
+
  private:
+  struct Question;
+  void AskHost(UINT message, LPARAM data, std::initializer_list<UINT> answers, std::function<void(LPARAM)> take);
+  // Stores the lists every view files (500, 503, 505, 601).
+  void FileList(UINT message, LPARAM data);
+
   const addon::ViewClassInfo& m_info;
+  addon::InstrumentActions m_actions{*this};
+  Question* m_question = nullptr;  // innermost question inside SendChildFeedback
   std::wstring m_title;
   std::wstring m_lastMessageText;
   std::map<std::string, std::wstring> m_messageTexts;  // lookup key -> text, only non-empty
-  std::string m_pendingSettingKey;  // key of the 515/518 inside SendChildFeedback
-  bool m_settingAnswered = false;
   bool m_linkMode = false;
   bool m_useAltStatus = false;
   bool m_active = false;
   bool m_loggerRegistered = false;
   int m_displayMode = 0;
+  // Trade keys: the widgets watched (true: a text entry).
+  std::map<const QObject*, bool> m_tradeKeyWidgets;
+  const QEvent* m_textKeyEvent = nullptr;  // a key typed into a search box, passed on
 };
 
 // The descriptor of a view class, in the host framework's style.

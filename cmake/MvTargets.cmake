@@ -3,9 +3,44 @@
 
 set(MV_WARNINGS -Wall -Wextra -Wno-unused-parameter -Wno-missing-field-initializers)
 
-# mv_library(NAME <target> TYPE SHARED|STATIC|INTERFACE SOURCES ... PUBLIC_DEPS ... PRIVATE_DEPS ... INCLUDE <dir>)
+# mv_include_root(<out-var> <name> <folder>...)
+# Each layer's include root: a directory in the build tree holding only links
+# to the layer's own source folders ("data", "terminal/host"...). A target puts
+# it on its public include path, so "data/CellStore.h" keeps its spelling while
+# a target sees only the folders of the targets it links.
+function(mv_include_root out name)
+  set(root ${CMAKE_BINARY_DIR}/include-roots/${name})
+  foreach(folder ${ARGN})
+    set(source ${CMAKE_SOURCE_DIR}/${folder})
+    if(NOT IS_DIRECTORY ${source})
+      message(FATAL_ERROR "include root ${name}: folder ${folder} does not exist")
+    endif()
+    set(link ${root}/${folder})
+    if(IS_SYMLINK ${link})
+      file(READ_SYMLINK ${link} current)
+      if(current STREQUAL source)
+        continue()
+      endif()
+      file(REMOVE ${link})
+    elseif(EXISTS ${link})
+      message(FATAL_ERROR "include root ${name}: ${link} exists and is not a link")
+    endif()
+    get_filename_component(parent ${link} DIRECTORY)
+    file(MAKE_DIRECTORY ${parent})
+    file(CREATE_LINK ${source} ${link} SYMBOLIC)
+  endforeach()
+  set(${out} ${root} PARENT_SCOPE)
+endfunction()
+
+# mv_library(NAME <target> TYPE SHARED|STATIC|INTERFACE SOURCES ... PUBLIC_DEPS ... PRIVATE_DEPS ...
+#            INCLUDE <dir> | FOLDERS <folder>...)
+# FOLDERS: the source folders the target is made of; they become its include
+# root (see mv_include_root).
 function(mv_library)
-  cmake_parse_arguments(A "" "NAME;TYPE;INCLUDE" "SOURCES;PUBLIC_DEPS;PRIVATE_DEPS" ${ARGN})
+  cmake_parse_arguments(A "" "NAME;TYPE;INCLUDE" "SOURCES;PUBLIC_DEPS;PRIVATE_DEPS;FOLDERS" ${ARGN})
+  if(A_FOLDERS)
+    mv_include_root(A_INCLUDE ${A_NAME} ${A_FOLDERS})
+  endif()
   if(A_TYPE STREQUAL "INTERFACE")
     add_library(${A_NAME} INTERFACE)
     target_include_directories(${A_NAME} INTERFACE ${A_INCLUDE})

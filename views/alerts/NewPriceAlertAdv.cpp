@@ -4,12 +4,12 @@ ADDON_IMPLEMENT_VIEW(CNewPriceAlertAdv)
 
 const addon::ViewClassInfo& CNewPriceAlertAdv::Info() {
   static const addon::ViewClassInfo info{
-      "CNewPriceAlertAdv",
-      "NewPriceAlertAdv.cpp",
-      725,
-      L"New Price Alert",
-      {{hm::SystemParameter, "ALEML"}, {hm::SystemParameter, "ALSMS"}, {hm::SystemParameter, "MAXPA"}},
-      {addon::RefStore::Products, addon::RefStore::Instruments},
+      .className = "CNewPriceAlertAdv",
+      .titleEntry = 725,
+      .defaultTitle = L"New Price Alert",
+      .firstSettings = {{hm::SystemParameter, "ALEML"}, {hm::SystemParameter, "ALSMS"}, {hm::SystemParameter, "MAXPA"}},
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .descriptor = &classCNewPriceAlertAdv,
   };
   return info;
 }

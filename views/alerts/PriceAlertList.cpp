@@ -4,12 +4,11 @@ ADDON_IMPLEMENT_VIEW(CPriceAlertList)
 
 const addon::ViewClassInfo& CPriceAlertList::Info() {
   static const addon::ViewClassInfo info{
-      "CPriceAlertList",
-      "PriceAlertList.cpp",
-      9,
-      L"Price Alerts",
-      {},
-      {addon::RefStore::Products, addon::RefStore::Instruments},
+      .className = "CPriceAlertList",
+      .titleEntry = 9,
+      .defaultTitle = L"Price Alerts",
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .descriptor = &classCPriceAlertList,
   };
   return info;
 }

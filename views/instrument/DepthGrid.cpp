@@ -11,7 +11,7 @@
 #include "hostview/Services.h"
 #include "hostview/Text.h"
 #include "platform/Platform.h"
-#include "views/instrument/DepthFeed.h"
+#include "addon/Feeds.h"
 
 namespace {
 
@@ -128,20 +128,25 @@ void DepthGrid::SetInstrument(const InstrumentKey& key, int levelCount) {
   m_filled = 0;
   m_key = key;
   m_levelCount = levelCount;
-  depth::Register(m_key, m_levelCount, platform::TickCount());
+  addon::DepthFeed::Instance().Register(m_key, m_levelCount, platform::TickCount());
   LayoutColumns();
 }
 
 void DepthGrid::SetLevelCount(int levelCount) {
   m_levelCount = levelCount;
-  depth::Register(m_key, m_levelCount, platform::TickCount());
+  addon::DepthFeed::Instance().Register(m_key, m_levelCount, platform::TickCount());
 }
 
 std::uint64_t DepthGrid::NewestStamp() {
   if (m_key.InstrumentCode.empty()) return 0;
-  const depth::BookExtent extent = depth::Extent(m_key);
-  if (extent.filled != m_filled) {
-    m_filled = extent.filled;
+  // Filled levels run from level 1 up to the first level whose buy and sell
+  // prices are both zero or without text.
+  const auto extent = addon::DepthFeed::Instance().LeadingRun(
+      addon::DepthLevels(m_key, 1, addon::DepthFeedTraits::kMaxLevels), [](const DepthRecord& r) {
+        return HasPrice(r[DepthLayout::Buy]) || HasPrice(r[DepthLayout::Sell]);
+      });
+  if (extent.count != m_filled) {
+    m_filled = extent.count;
     SetNumberRows(m_filled);
     LayoutColumns();
   }
@@ -201,7 +206,8 @@ void DepthGrid::OnGetCell(int col, int row, CGridCell& cell) {
   cell.SetBackColor(RowBackColor(row));
 
   QuoteCell value;
-  if (!depth::ReadCell(m_key, row + 1, Columns()[std::size_t(position)].field, value)) return;
+  const DepthKey levelKey{m_key.ProductID, m_key.InstrumentCode, row + 1};
+  if (!addon::DepthFeed::Instance().ReadCell(levelKey, Columns()[std::size_t(position)].field, value)) return;
   if (IsPriceColumn(position)) {
     // Prices as the store formats them (instrument decimals), never highlighted.
     if (value.value != 0.0) cell.SetText(value.text);
@@ -239,7 +245,7 @@ void DepthGrid::OnLClicked(int col, int row, bool pressed, const QRect&, const Q
 void DepthGrid::OpenTrade(int position, int row) {
   if (!IsPriceColumn(position) || row < 0) return;
   DepthRecord level;
-  if (!depth::ReadLevel(m_key, row + 1, level)) return;
+  if (!addon::DepthFeed::Instance().Read(DepthKey{m_key.ProductID, m_key.InstrumentCode, row + 1}, level)) return;
   const bool buy = position == kBuy;
   const std::wstring& price = level[buy ? DepthLayout::Buy : DepthLayout::Sell].text;
   if (price.empty()) return;

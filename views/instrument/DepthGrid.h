@@ -14,6 +14,7 @@
 #include <vector>
 
 #include "data/Keys.h"
+#include "data/MarketStores.h"
 #include "views/instrument/InstrumentGrid.h"
 
 class DepthGrid : public CInstrumentGrid {
@@ -72,6 +73,9 @@ class DepthGrid : public CInstrumentGrid {
   void SetStyleManager(IStyleManager* style) override;
   void ApplyLanguage(const ILanguage* language) override;
   std::wstring HeadingText(int position) const;
+
+  // Whether a price cell counts as "a price" for the filled-level rule.
+  static bool HasPrice(const QuoteCell& cell) { return cell.value != 0.0 && !cell.text.empty(); }
 
   // The cell text the user sees at (shown column, row), as drawn.
   QString CellText(int col, int row);

@@ -3,30 +3,34 @@
 #include <algorithm>
 
 #include "addon/Channel.h"
+#include "addon/Feeds.h"
 #include "addon/Registries.h"
 #include "data/MarketStores.h"
 #include "hostconfig/UserSettings.h"
 #include "hostview/Text.h"
 #include "platform/Platform.h"
-#include "views/instrument/DepthFeed.h"
 #include "views/instrument/DepthGrid.h"
 
 ADDON_IMPLEMENT_VIEW(CMarketDepthAdv)
 
 const addon::ViewClassInfo& CMarketDepthAdv::Info() {
   static const addon::ViewClassInfo info{
-      "CMarketDepthAdv",
-      "MarketDepthAdv.cpp",
-      7,
-      L"Market Depth",
-      {},
-      {addon::RefStore::Products, addon::RefStore::Instruments},
+      .className = "CMarketDepthAdv",
+      .titleEntry = 7,
+      .defaultTitle = L"Market Depth",
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .refusalKey = "17001",
+      .dropSources = addon::kInstrumentViewSources,
+      .descriptor = &classCMarketDepthAdv,
   };
   return info;
 }
 
 CMarketDepthAdv::CMarketDepthAdv() : CSingleInstrumentView(Info()) {}
 CMarketDepthAdv::~CMarketDepthAdv() = default;
+
+void CMarketDepthAdv::OnActivate() { ActivateInstrumentView(); }
+void CMarketDepthAdv::OnDeactivate() { DeactivateInstrumentView(); }
 
 CInstrumentGrid* CMarketDepthAdv::CreateGrid() {
   m_depthGrid = new DepthGrid(this);
@@ -84,7 +88,9 @@ std::uint32_t CMarketDepthAdv::OnInstrumentViewMessage(UINT message, LPARAM data
 }
 
 void CMarketDepthAdv::ApplyFieldUpdate(const FieldUpdate& update) {
-  if (update.kind != 1 || update.param < depth::kMinLevels || update.param > depth::kMaxLevels) return;
+  if (update.kind != 1 || update.param < addon::DepthFeedTraits::kMinLevels ||
+      update.param > addon::DepthFeedTraits::kMaxLevels)
+    return;
   // Every depth view may be handed the same update: one of them applies it.
   if (!IsCurrentRegistration()) return;
   ::ApplyFieldUpdate(DepthStore::Instance(), update, platform::TickCount());
@@ -100,34 +106,23 @@ void CMarketDepthAdv::OnSettingsChanged() {
   m_depthGrid->Redraw();
 }
 
-void CMarketDepthAdv::ResubscribeAll() {
-  for (CSuperBaseView* view : addon::UserViews().Views()) {
-    auto* other = dynamic_cast<CMarketDepthAdv*>(view);
-    if (!other || !other->m_depthGrid || other->m_depthGrid->Instrument().InstrumentCode.empty()) continue;
-    depth::Register(other->m_depthGrid->Instrument(), other->m_levelCount, platform::TickCount());
+void CMarketDepthAdv::RegisterShownInterest() {
+  if (!m_depthGrid || m_depthGrid->Instrument().InstrumentCode.empty()) return;
+  addon::DepthFeed::Instance().Register(m_depthGrid->Instrument(), m_levelCount, platform::TickCount());
+}
+
+void CMarketDepthAdv::SendPendingInterest() {
+  for (const auto& pending : addon::DepthFeed::Instance().TakePending()) {
+    const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
+    addon::SendInterestBatches(Sender(), target, addon::DepthInterest(pending.params));
   }
 }
 
+void CMarketDepthAdv::ExpireMarks(std::uint32_t now) { addon::DepthFeed::Instance().ExpireMarks(now); }
+
 void CMarketDepthAdv::OnRefreshTick() {
-  const bool current = IsCurrentRegistration();
-  // A terminal may hand a subscription's values to the view that asked for it
-  // only. So the current view, the one that applies them, asks for every
-  // depth view; when it closes, its successor asks again for what is shown.
-  if (current && m_tickedBefore && !m_wasCurrent) ResubscribeAll();
-  m_wasCurrent = current;
-  m_tickedBefore = true;
-  // 1. Subscriptions wanted since the last tick.
-  if (current) {
-    const addon::FeedbackSender send = [this](UINT message, LPARAM data) { SendChildFeedback(message, data); };
-    for (const depth::PendingDepth& pending : depth::TakePending()) {
-      const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
-      addon::SendInterestBatches(send, target, addon::DepthInterest(pending.levelCount));
-    }
-  }
-  // 2. Marks age once, by the current view.
-  if (current) DepthStore::Instance().ExpireMarks(platform::TickCount());
-  // 3. Redraw when something newer than what is drawn arrived; grow the book
-  //    while every asked level is filled.
+  // Redraw when something newer than what is drawn arrived; grow the book
+  // while every asked level is filled.
   if (!m_depthGrid) return;
   const std::uint64_t stamp = m_depthGrid->NewestStamp();
   if (stamp == 0 || stamp <= m_lastStamp) return;

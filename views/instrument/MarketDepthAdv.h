@@ -3,11 +3,12 @@
 // orders, read from the process-wide DepthStore that every depth view shares.
 //
 // A selection asks for 5 levels; each refresh that finds every asked level
-// filled asks for 16 more (5, 21, 37, ... 99). Updates (410/412, kind 1,
-// level 1..99) are applied by the depth view whose registration value is
-// current only, so that an update relayed to every depth view lands once;
-// that view also sends the subscriptions of all depth views, so that a
-// terminal that answers only the asking view still reaches it.
+// filled asks for 16 more (5, 21, 37, ... 99). The interest goes through the
+// depth feed (addon::DepthFeed); by the rule of the single-instrument base,
+// updates (410/412, kind 1, level 1..99) are applied by the depth view whose
+// registration value is current only, so that an update relayed to every
+// depth view lands once, and that view sends the subscriptions of all depth
+// views, so that a terminal that answers only the asking view still reaches it.
 #include <cstdint>
 #include <string>
 
@@ -36,9 +37,13 @@ class CMarketDepthAdv : public CSingleInstrumentView {
 
  protected:
   CInstrumentGrid* CreateGrid() override;
+  void OnActivate() override;
+  void OnDeactivate() override;
   void OnInstrumentSelected(const JInstrumentUnderlying& instrument) override;
+  void RegisterShownInterest() override;
+  void SendPendingInterest() override;
+  void ExpireMarks(std::uint32_t now) override;
   void OnRefreshTick() override;
-  const char* RefusalKey() const override { return "17001"; }
   std::wstring EmptyStateText() override;
   void ShowRefusedColumns() override;
   std::optional<std::wstring> SavedColumnMask() const override;
@@ -48,14 +53,10 @@ class CMarketDepthAdv : public CSingleInstrumentView {
  private:
   void ApplyFieldUpdate(const FieldUpdate& update);
   void OnSettingsChanged();
-  // Registers the instrument of every open depth view again.
-  void ResubscribeAll();
 
   DepthGrid* m_depthGrid = nullptr;
   int m_levelCount = kFirstLevels;
   std::uint64_t m_lastStamp = 0;
   std::wstring m_emptyText;     // the host's "17005" text, asked once
   bool m_maskRestored = false;  // a saved mask waits for the restored instrument
-  bool m_wasCurrent = false;    // current at the last tick
-  bool m_tickedBefore = false;
 };

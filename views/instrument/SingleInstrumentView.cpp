@@ -4,14 +4,11 @@
 #include <QLineEdit>
 #include <QPainter>
 #include <algorithm>
-#include <cstring>
 
 #include "addon/LinkText.h"
 #include "addon/RegisteredMessages.h"
-#include "addon/TextTables.h"
 #include "controls/InstrumentComboBox.h"
 #include "data/ReferenceStores.h"
-#include "hostconfig/UserSettings.h"
 #include "hostview/Buttons.h"
 #include "hostview/CustomTabCtrl.h"
 #include "hostview/HostLists.h"
@@ -25,43 +22,12 @@ constexpr int kSecondButtonId = 2016;
 constexpr int kButtonSize = 18;
 constexpr COLORREF kButtonBack = MakeColorRef(0xCC, 0xCC, 0xCC);
 
-// Title entries (section 13) of the stacked view kinds.
-int KindTitleEntry(const char* className) {
-  if (!className) return 0;
-  if (std::strcmp(className, "CMarketDepthAdv") == 0) return 7;
-  if (std::strcmp(className, "CTimeAndSalesAdv") == 0) return 8;
-  if (std::strcmp(className, "CTradeSummaryAdv") == 0) return 10;
-  return 0;
-}
-
 std::wstring ReplaceStyleId(std::wstring path, int styleId) {
   static const std::wstring kPlaceholder = L"[styleID]";
   const std::wstring id = std::to_wstring(styleId);
   for (std::size_t at = path.find(kPlaceholder); at != std::wstring::npos; at = path.find(kPlaceholder, at + id.size()))
     path.replace(at, kPlaceholder.size(), id);
   return path;
-}
-
-enum class ShortcutSide { None, Buy, Sell };
-
-// The six shortcut keys: keypad plus, F5 and the plus/equals key buy; keypad
-// minus, F9 and the minus key sell. `mainKey` tells whether it is one of the
-// main-keyboard keys that also type text.
-ShortcutSide ShortcutOf(int key, Qt::KeyboardModifiers modifiers, bool* mainKey) {
-  const bool keypad = modifiers & Qt::KeypadModifier;
-  *mainKey = false;
-  switch (key) {
-    case Qt::Key_F5: return ShortcutSide::Buy;
-    case Qt::Key_F9: return ShortcutSide::Sell;
-    case Qt::Key_Plus:
-    case Qt::Key_Equal:
-      *mainKey = !keypad;
-      return ShortcutSide::Buy;
-    case Qt::Key_Minus:
-      *mainKey = !keypad;
-      return ShortcutSide::Sell;
-    default: return ShortcutSide::None;
-  }
 }
 
 }  // namespace
@@ -97,7 +63,7 @@ void CSingleInstrumentView::BuildControls() {
   m_explorer->SetBkColor(kButtonBack);
   m_explorer->SetTooltipText(L"Instrument Explorer");
   m_explorer->setFocusPolicy(Qt::NoFocus);
-  connect(m_explorer, &CHostButton::commandClicked, this, [this](int) { OnExplorerClicked(); });
+  connect(m_explorer, &CHostButton::commandClicked, this, [this](int) { Actions().OpenInstrumentExplorer(); });
 
   m_second = new CImageButton(this, kSecondButtonId);
   m_second->SetBkColor(kButtonBack);
@@ -111,18 +77,20 @@ void CSingleInstrumentView::BuildControls() {
     m_grid->ApplyLanguage(m_pLanguage);
     m_grid->show();
   }
-  for (QWidget* w : {static_cast<QWidget*>(m_combo), static_cast<QWidget*>(m_grid)}) WatchKeys(w);
-  if (m_grid) WatchKeys(m_grid->viewport());
-  if (m_combo->lineEdit()) WatchKeys(m_combo->lineEdit());
+  // The trade keys work wherever the focus is; the search box keeps the
+  // main-keyboard plus and minus as text.
+  WatchTradeKeys(this);
+  WatchTradeKeys(m_combo, /*textEntry*/ true);
+  if (m_combo->lineEdit()) WatchTradeKeys(m_combo->lineEdit(), /*textEntry*/ true);
+  if (m_grid) {
+    WatchTradeKeys(m_grid);
+    WatchTradeKeys(m_grid->viewport());
+  }
 
   SetStyleManager(m_pStyleManager);
   ReloadImages();
   ReloadComboList();
   Relayout();
-}
-
-void CSingleInstrumentView::WatchKeys(QWidget* widget) {
-  if (widget) widget->installEventFilter(this);
 }
 
 void CSingleInstrumentView::ReloadComboList() {
@@ -148,11 +116,6 @@ void CSingleInstrumentView::OnComboChosen() {
   SelectInstrument(chosen);
 }
 
-void CSingleInstrumentView::OnExplorerClicked() {
-  const std::wstring name = L"CInsExpViewEx";
-  SendChildFeedback(hm::OpenView, ToLParam(&name));
-}
-
 void CSingleInstrumentView::ReloadImages() {
   const std::wstring path = ReplaceStyleId(kExplorerImage, m_styleId);
   if (m_explorer) m_explorer->LoadBitmap(path);
@@ -166,10 +129,10 @@ void CSingleInstrumentView::UpdateExplorerVisibility() {
 // ---- Contract --------------------------------------------------------------------
 
 bool CSingleInstrumentView::EnableDropIn(const char* sourceClassName) {
-  const std::string source = sourceClassName ? sourceClassName : "";
-  if (source == "price view") return true;
+  const std::string_view source = sourceClassName ? sourceClassName : "";
+  if (source == addon::kPriceViewSource) return true;
   if (IsPopview()) return false;
-  return source == "CTimeAndSalesAdv" || source == "CTradeSummaryAdv" || source == "CMarketDepthAdv";
+  return addon::IsDropSource(ClassInfo(), source);
 }
 
 void CSingleInstrumentView::ChangeStyle(int styleId) {
@@ -205,18 +168,13 @@ std::wstring CSingleInstrumentView::BuildTitle() const {
   std::wstring title = LanguageText(ClassInfo().titleEntry);
   if (title.empty() && ClassInfo().defaultTitle) title = ClassInfo().defaultTitle;
   if (!m_current) return title;
-  if (ProductTypeOf(*m_current) == L"DMA") title = L"Cash " + title;
+  if (addon::ProductTypeOf(*m_current) == L"DMA") title = L"Cash " + title;
   title += L" - ";
   title += hv::Widen(m_current->instrumentName);
   return title;
 }
 
 void CSingleInstrumentView::UpdateTitle() { SendTitle(BuildTitle()); }
-
-std::wstring CSingleInstrumentView::ProductTypeOf(const JInstrumentUnderlying& instrument) const {
-  if (const JProduct* product = ProductMgr().FindPtr(instrument.productId)) return hv::Widen(product->productType);
-  return hv::Widen(instrument.productType);
-}
 
 const JInstrumentUnderlying* CSingleInstrumentView::FindInstrument(std::int64_t productId,
                                                                    const std::wstring& code) const {
@@ -227,10 +185,10 @@ const JInstrumentUnderlying* CSingleInstrumentView::FindInstrument(std::int64_t 
 
 void CSingleInstrumentView::StartTimers(bool) { platform::SetTimer(this, kRefreshTimer, kRefreshMs); }
 
-void CSingleInstrumentView::OnActivate() {
+void CSingleInstrumentView::ActivateInstrumentView(std::source_location where) {
   SendViewSize(kPreferredWidth, kPreferredHeight);
   StartTimers(true);
-  PrepareBasicData();
+  PrepareBasicData(where);
   QueryDisplayMode();
   ReloadComboList();
   ApplyColumns();
@@ -241,8 +199,8 @@ void CSingleInstrumentView::OnActivate() {
   SetActiveFlag(true);
 }
 
-void CSingleInstrumentView::OnDeactivate() {
-  PrepareBasicData();
+void CSingleInstrumentView::DeactivateInstrumentView(std::source_location where) {
+  PrepareBasicData(where);
   StartTimers(false);
   SetActiveFlag(false);
 }
@@ -254,36 +212,20 @@ std::uint32_t CSingleInstrumentView::OnViewMessage(UINT message, LPARAM data) {
       if (link->link) ApplyStartParams(*link->link);
       return 0;
     }
-    case hm::InstrumentList: {
-      const auto* msg = FromLParam<const JInstrumentListMsg>(data);
-      InstrumentMgr_ReadOnly().Fill(msg->instruments);
-      m_instrumentList = nullptr;  // attach the new list
+    case hm::InstrumentList:  // filed by the base: attach the new list
+    case hm::ProductList:     // the combo box keeps a copy of the product map
+      m_instrumentList = nullptr;
       ReloadComboList();
       return 0;
-    }
-    case hm::ProductList: {
-      const auto* msg = FromLParam<const JProductListMsg>(data);
-      if (msg->products) ProductMgr().Fill(*msg->products);
-      m_instrumentList = nullptr;  // the combo box keeps a copy of the product map
-      ReloadComboList();
-      return 0;
-    }
     case hm::CompactLayout:
       m_saveSpace = data == 1 ? 1 : 0;
       Relayout();
       repaint();
       return 0;
-    case hm::FindByChartCode:
-    case hm::FindByCode:
-      m_linkAnswer = FromLParam<const JInstrumentUnderlying>(data);
+    case hm::ExchangeEnabled:
+      // Outside a question: about the shown instrument's exchange.
+      if (m_current) Actions().NoteExchangeAnswer(m_current->exchangeCode, data != 0);
       return 0;
-    case hm::ExchangeEnabled: {
-      std::string code = m_checkingExchange;
-      if (code.empty() && m_current) code = m_current->exchangeCode;
-      if (data) m_enabledExchanges.insert(code);
-      else m_enabledExchanges.erase(code);
-      return 0;
-    }
     case hm::LinkedInstrument:
       if (LinkMode()) ApplyLinkUpdate(*FromLParam<const std::wstring>(data));
       return 0;
@@ -294,34 +236,23 @@ std::uint32_t CSingleInstrumentView::OnViewMessage(UINT message, LPARAM data) {
 
 // ---- Selection -----------------------------------------------------------------------
 
-bool CSingleInstrumentView::CheckExchange(const JInstrumentUnderlying& instrument) {
-  if (IsExchangeEnabled(instrument.exchangeCode)) return true;
-  JExchangeList exchange;
-  exchange.exchangeCode = instrument.exchangeCode;
-  exchange.productId = instrument.productId;
-  m_checkingExchange = instrument.exchangeCode;
-  SendChildFeedback(hm::ExchangeEnabled, ToLParam(&exchange));
-  m_checkingExchange.clear();
-  return IsExchangeEnabled(instrument.exchangeCode);
-}
-
 bool CSingleInstrumentView::SelectInstrument(const JInstrumentUnderlying& instrument) {
   // The record may live in a list the host replaces while we ask it things.
   const JInstrumentUnderlying chosen = instrument;
-  m_accessStatus = QueryAltStatus() ? chosen.altAccessStatus : chosen.accessStatus;
-  if (!IsViewableStatus(m_accessStatus)) {
+  m_accessStatus = Actions().AccessStatusOf(chosen);
+  if (!addon::IsViewableStatus(m_accessStatus)) {
     RecordStartParams(chosen.productId, chosen.instrumentCode);
-    ClearWithMessage(kNotViewableText);
+    ClearWithMessage(addon::kNotViewableText);
     return false;
   }
-  if (DisplayModeValue() != 101 && ProductTypeOf(chosen) == L"CFD") {
+  if (DisplayModeValue() != 101 && addon::ProductTypeOf(chosen) == L"CFD") {
     RecordStartParams(chosen.productId, chosen.instrumentCode);
-    ClearWithMessage(LookupMessageText(kCfdRefusalKey, chosen.productId));
+    ClearWithMessage(Actions().RefusalText(addon::kCfdRefusalKey, chosen.productId));
     return false;
   }
-  if (!CheckExchange(chosen)) {
+  if (ClassInfo().refusalKey && !Actions().IsExchangeEnabled(chosen)) {
     RecordStartParams(chosen.productId, chosen.instrumentCode);
-    ClearWithMessage(LookupMessageText(RefusalKey(), chosen.productId));
+    ClearWithMessage(Actions().RefusalText(ClassInfo().refusalKey, chosen.productId));
     return false;
   }
 
@@ -354,6 +285,20 @@ void CSingleInstrumentView::ClearWithMessage(const std::wstring& text) {
     m_grid->SetMessage(text);
     m_grid->Redraw();
   }
+  update();
+}
+
+void CSingleInstrumentView::ClearInstrument() {
+  m_current.reset();
+  m_accessStatus = 0;
+  if (m_grid) {
+    m_grid->Reset();
+    m_grid->SetMessage({});
+    m_grid->Redraw();
+  }
+  RecordStartParams(-1, std::string());
+  UpdateTitle();
+  if (m_combo && m_instrumentList) m_combo->ShowPlaceholder();
   update();
 }
 
@@ -392,7 +337,9 @@ bool CSingleInstrumentView::ApplyStartParams(const std::wstring& linkText) {
     SelectInstrument(*found);
     m_fromStartParams = false;
   } else {
-    RecordStartParams(-1, std::string());
+    // The old instrument must not go on showing (and updating) under
+    // parameters that name another one.
+    ClearInstrument();
   }
   return true;
 }
@@ -409,96 +356,28 @@ void CSingleInstrumentView::ApplyLinkUpdate(const std::wstring& linkText) {
   JInstrumentLink record;
   record.productId = productId;
   record.number = static_cast<std::int32_t>(link->GetInt64(addon::linkkey::kRelatedOrderType).value_or(0));
-  m_linkAnswer = nullptr;
-  if (!chartCode.empty()) {
-    record.text = chartCode;
-    SendChildFeedback(hm::FindByChartCode, ToLParam(&record));
-  } else {
-    record.text = code;
-    SendChildFeedback(hm::FindByCode, ToLParam(&record));
-  }
-  if (!m_linkAnswer) return;
-  const JInstrumentUnderlying found = *m_linkAnswer;
-  m_linkAnswer = nullptr;
-  SelectInstrument(found);
+  const bool byChart = !chartCode.empty();
+  record.text = byChart ? chartCode : code;
+  const auto found =
+      Ask<JInstrumentUnderlying>(byChart ? hm::FindByChartCode : hm::FindByCode, ToLParam(&record));
+  if (found) SelectInstrument(*found);
 }
 
 // ---- Trade tickets and shortcuts ---------------------------------------------------------
 
 LRESULT CSingleInstrumentView::OpenTradeTicket(const std::wstring* linkText, LPARAM origin) {
-  if (origin == -1) {
-    ShowMessageText("17007");
+  if (origin != addon::kRefusedTradeOrigin && !IsTradeable()) {
+    ShowMessage(addon::kNotTradeableText, platform::Icon::Exclamation);
     return 0;
   }
-  if (!IsTradeable()) {
-    ShowMessage(kNotTradeableText, platform::Icon::Exclamation);
-    return 0;
-  }
-  ViewLink link;
-  link.className = L"CTradeView";
-  link.flag = 1;
-  link.reserved = 0;
-  link.link = linkText;
-  if (origin == kShortcutOrigin) {
-    const std::wstring context = L"OPEN_TRADE_SHORTCUT";
-    SendChildFeedback(hm::ShortcutContext, ToLParam(&context));
-  }
-  SendChildFeedback(hm::OpenView, ToLParam(&link));
-  SendChildFeedback(hm::LinkData, ToLParam(&link));
-  return 0;
+  return CAddonView::OpenTradeTicket(linkText, origin);
 }
 
-bool CSingleInstrumentView::HandleShortcutKey(int key, Qt::KeyboardModifiers modifiers, bool inTextEntry) {
-  bool mainKey = false;
-  const ShortcutSide side = ShortcutOf(key, modifiers, &mainKey);
-  if (side == ShortcutSide::None) return false;
-  // In the instrument search box the main-keyboard plus, equals and minus
-  // type text (codes contain them); the keypad and function keys still trade.
-  if (inTextEntry && mainKey) return false;
-  if (!GetUserSettings().GetKeyboardShortcutsSetting().GetEnableKeyboardShortcuts()) return true;
-  if (!m_current) return true;
+std::optional<std::wstring> CSingleInstrumentView::ShortcutTicket(addon::TradeSide side) {
+  if (!m_current) return std::nullopt;
   const JInstrumentUnderlying* found = FindInstrument(m_current->productId, hv::Widen(m_current->instrumentCode));
-  if (!found) return true;
-  const bool buy = side == ShortcutSide::Buy;
-  addon::LinkTextBuilder link("price view");
-  link.Add(addon::linkkey::kInstrumentCode, found->instrumentCode)
-      .AddInt64(addon::linkkey::kProductId, found->productId)
-      .Add(addon::linkkey::kSide, buy ? "buy" : "sell")
-      .Add(addon::linkkey::kFillPrice, buy ? "ASK" : "BID");
-  const std::wstring text = link.Wide();
-  OpenTradeTicket(&text, kShortcutOrigin);
-  return true;
-}
-
-bool CSingleInstrumentView::eventFilter(QObject* watched, QEvent* event) {
-  if (event->type() == QEvent::KeyPress || event->type() == QEvent::ShortcutOverride) {
-    auto* key = static_cast<QKeyEvent*>(event);
-    // The combo box passes on what its edit field does not take.
-    const bool inText = m_combo && (watched == m_combo->lineEdit() || watched == m_combo);
-    bool mainKey = false;
-    const ShortcutSide side = ShortcutOf(key->key(), key->modifiers(), &mainKey);
-    if (side != ShortcutSide::None && inText && mainKey) {
-      // Text for the search box; should the box not take it, it must not come
-      // back to the view as a shortcut.
-      if (event->type() == QEvent::KeyPress) m_textKeyEvent = event;
-    } else if (side != ShortcutSide::None) {
-      // Taken before any other shortcut of the terminal; acted on when pressed.
-      if (event->type() == QEvent::KeyPress) HandleShortcutKey(key->key(), key->modifiers(), inText);
-      event->accept();
-      return true;
-    }
-  }
-  return CAddonView::eventFilter(watched, event);
-}
-
-void CSingleInstrumentView::keyPressEvent(QKeyEvent* e) {
-  const bool fromText = e == m_textKeyEvent;
-  m_textKeyEvent = nullptr;
-  if (HandleShortcutKey(e->key(), e->modifiers(), fromText)) {
-    e->accept();
-    return;
-  }
-  CAddonView::keyPressEvent(e);
+  if (!found) return std::nullopt;
+  return addon::ShortcutTicketText(found->instrumentCode, found->productId, side).Wide();
 }
 
 // ---- Window messages and timers ---------------------------------------------------------
@@ -519,7 +398,28 @@ LRESULT CSingleInstrumentView::OnWindowMessage(UINT message, WPARAM wParam, LPAR
 }
 
 void CSingleInstrumentView::OnTimer(UINT id) {
-  if (id == kRefreshTimer) OnRefreshTick();
+  if (id == kRefreshTimer) RefreshTick();
+  else OnOtherTimer(id);
+}
+
+void CSingleInstrumentView::RefreshTick() {
+  const bool current = IsCurrentRegistration();
+  // A terminal may hand a subscription's values to the view that asked for
+  // it only. So the current view, the one that applies them, asks for every
+  // view of its class; when it closes, its successor asks again for what is shown.
+  if (current && m_tickedBefore && !m_wasCurrent) {
+    for (CSuperBaseView* view : addon::UserViews().Views()) {
+      if (view->GetRuntimeClass() != GetRuntimeClass()) continue;
+      if (auto* same = dynamic_cast<CSingleInstrumentView*>(view)) same->RegisterShownInterest();
+    }
+  }
+  m_wasCurrent = current;
+  m_tickedBefore = true;
+  if (current) {
+    SendPendingInterest();
+    ExpireMarks(platform::TickCount());
+  }
+  OnRefreshTick();
 }
 
 // ---- Drops and tabs ------------------------------------------------------------------------
@@ -541,12 +441,10 @@ LRESULT CSingleInstrumentView::DoDragDrop(UINT message, LPARAM data) {
 }
 
 std::wstring CSingleInstrumentView::KindTitle(const CSuperBaseView* view) const {
-  const char* className = view && view->GetRuntimeClass() ? view->GetRuntimeClass()->m_lpszClassName : nullptr;
-  const int entry = KindTitleEntry(className);
-  std::wstring text = entry ? LanguageText(entry) : std::wstring();
-  if (text.empty() && view) {
-    if (const auto* same = dynamic_cast<const CAddonView*>(view)) text = same->ClassInfo().defaultTitle;
-  }
+  const addon::ViewClassInfo* info = addon::FindViewClass(view);
+  if (!info) return {};
+  std::wstring text = info->titleEntry ? LanguageText(info->titleEntry) : std::wstring();
+  if (text.empty() && info->defaultTitle) text = info->defaultTitle;
   return text;
 }
 

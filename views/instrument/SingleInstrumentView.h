@@ -1,42 +1,54 @@
 #pragma once
-// CSingleInstrumentView: the shared shape of the views that show one
-// instrument at a time (market depth, time and sales, trade summary).
-//
-// What it does for every such view:
-//   - child controls: the instrument combo box (2110), the instrument-explorer
+// CSingleInstrumentView: the shape of the views that show one instrument at
+// a time (market depth, time and sales, trade summary). What all views share
+// (questions, trade tickets, shortcut keys, access and exchange checks,
+// opening views) lives in CAddonView and addon::InstrumentActions; this class
+// adds what only these three views have:
+//   - child controls: the instrument combo box, the instrument-explorer
 //     button (2015) and a second, hidden button, the view's grid (made by the
 //     derived view), and a tab strip (notification id 2009) once views are
-//     stacked on it;
-//   - the registration value from the user registry (UserViews): only the view
-//     whose value is current applies updates of the shared stores and expires
-//     their marks (IsCurrentRegistration);
-//   - host notifications 1, 2, 310, 500, 505, 529, 550/551, 604, 615 (plus the
-//     answers CAddonView keeps: 514/2814, 519, 528, 2310);
-//   - the selection path with its access checks and refusal texts, start
-//     parameters in and out, link updates, drops, trade tickets
-//     (MSG_WLOPENTRADE), keyboard shortcuts, MSG_MDCOLUMNUPDATE, the layout
-//     with and without `saveSpace`, the 200 ms refresh timer (3101).
+//     stacked on it; the layout with and without `saveSpace`;
+//   - the registration value from the user registry (UserViews) and the
+//     store-feed rule: only the current view of the class (the first
+//     registered view of its class) applies updates of the shared stores,
+//     sends the pending requests of the class's feed and expires the marks;
+//     when it closes, its successor first has every view of the class
+//     register again what it shows (the terminal forgot the closed view's
+//     subscriptions);
+//   - host notifications 1, 2, 310, 500/505 (combo list), 529, 604, 615;
+//   - the selection path: access status (2310), "Counter is not Viewable.",
+//     CFD refusal ("14009"), exchange check (604) with the class's refusal key,
+//     then the view's data interest; start parameters in and out, link
+//     updates (550/551), drops;
+//   - trade tickets refused with "Counter is not Tradeable." unless the
+//     instrument is tradeable; shortcut tickets for the shown instrument;
+//     MSG_MDCOLUMNUPDATE; the 200 ms refresh timer (3101).
 //
 // A derived view supplies (all hooks have harmless defaults):
 //   CreateGrid()              its grid, a CInstrumentGrid, made once at creation;
+//   OnActivate/OnDeactivate   call ActivateInstrumentView()/DeactivateInstrumentView()
+//                             from the view's own file (its log lines name it);
 //   OnInstrumentSelected()    register the data interest of the new instrument
-//                             (the grid is already reset);
-//   OnRefreshTick()           timer 3101: send pending requests, expire marks
-//                             when current, redraw from the newest stamp;
-//   RefusalKey()              message key shown when the exchange is disabled
-//                             ("17001" depth, "17002" time and sales, "17003" summary);
+//                             in the class's feed (the grid is already reset);
+//   RegisterShownInterest()   register again what the view shows (successor rule);
+//   SendPendingInterest()     take the feed's pending interests, send their requests;
+//   ExpireMarks(now)          expire the marks of the class's stores;
+//   OnRefreshTick()           every view, every 200 ms: redraw from the newest stamp;
+//   OnOtherTimer(id)          the view's own timers;
 //   EmptyStateText()          the grid's text while an instrument has no rows;
 //   StartTimers(activation)   timers on host code 2 (true) and 1 (false);
 //   column-mask hooks         only the depth view keeps a column mask in its
-//                             start parameters.
-// The class-specific texts come from addon::ViewClassInfo (title entry 7, 8, 10).
+//                             start parameters;
+//   LayoutBody(area)          the area below the header: all of it for the grid
+//                             by default (the trade summary adds its chart).
+// The class-specific data (title entry 7, 8, 10; refusal key "17001",
+// "17002", "17003"; the drop sources) come from addon::ViewClassInfo.
 //
-// UI thread only. Requests with synchronous answers (514/2814, 519, 550/551,
-// 604, 2310) re-enter OnHostMessage before SendChildFeedback returns.
+// UI thread only. Requests with synchronous answers go through CAddonView::Ask.
 #include <QPointer>
 #include <cstdint>
 #include <optional>
-#include <set>
+#include <source_location>
 #include <string>
 #include <vector>
 
@@ -53,7 +65,6 @@ class CSingleInstrumentView : public CAddonView {
   Q_OBJECT
  public:
   // Control and timer ids.
-  static constexpr int kComboId = 2110;
   static constexpr int kExplorerButtonId = 2015;
   static constexpr int kTabNotifyId = 2009;
   static constexpr UINT kRefreshTimer = 3101;
@@ -65,12 +76,6 @@ class CSingleInstrumentView : public CAddonView {
   static constexpr int kTabStripHeight = 20;
   static constexpr int kHeaderHeight = 36;
   static constexpr int kComboLeft = 85;
-  // Trade tickets opened from a keyboard shortcut carry this origin.
-  static constexpr LPARAM kShortcutOrigin = 99;
-  // Texts of the common refusals (the system's own wording).
-  static constexpr const wchar_t* kNotViewableText = L"Counter is not Viewable.";
-  static constexpr const wchar_t* kNotTradeableText = L"Counter is not Tradeable.";
-  static constexpr const char* kCfdRefusalKey = "14009";
   static constexpr const wchar_t* kExplorerImage = L".\\images\\Toolbar\\[styleID]\\InstrumentExplorer.bmp";
 
   explicit CSingleInstrumentView(const addon::ViewClassInfo& info);
@@ -106,33 +111,26 @@ class CSingleInstrumentView : public CAddonView {
   // The shown instrument; null when none.
   const JInstrumentUnderlying* CurrentInstrument() const { return m_current ? &*m_current : nullptr; }
   int AccessStatus() const { return m_accessStatus; }
-  bool IsViewable() const { return IsViewableStatus(m_accessStatus); }
-  bool IsTradeable() const { return IsTradeableStatus(m_accessStatus); }
+  bool IsViewable() const { return addon::IsViewableStatus(m_accessStatus); }
+  bool IsTradeable() const { return addon::IsTradeableStatus(m_accessStatus); }
   int SaveSpace() const { return m_saveSpace; }
   bool OrderNumberMode() const { return LinkMode(); }
-  bool IsExchangeEnabled(const std::string& exchangeCode) const { return m_enabledExchanges.count(exchangeCode) != 0; }
   CInstrumentGrid* Grid() const { return m_grid; }
   CInstrumentComboBox* Combo() const { return m_combo; }
   CImageButton* ExplorerButton() const { return m_explorer; }
-
-  static bool IsViewableStatus(int status) { return status != 0 && status != 2; }
-  static bool IsTradeableStatus(int status) { return status != 0 && status != 1; }
 
   // ---- Actions (also reachable from the controls) ----
   // The selection path: access checks, refusals, then the view's data interest.
   // Returns whether the instrument is now shown.
   bool SelectInstrument(const JInstrumentUnderlying& instrument);
   // Applies the start parameters of a 310 (a JSON link text); false when it
-  // does not parse.
+  // does not parse. An instrument the store does not know clears the view.
   bool ApplyStartParams(const std::wstring& linkText);
   // A linked-instrument change (615).
   void ApplyLinkUpdate(const std::wstring& linkText);
-  // MSG_WLOPENTRADE: refuses when the instrument is not tradeable, else 206
-  // (origin 99 only), 200 and 310 with class "CTradeView".
-  LRESULT OpenTradeTicket(const std::wstring* linkText, LPARAM origin);
-  // A shortcut key; true when it is one of the six (consumed whether or not a
-  // ticket opens).
-  bool HandleShortcutKey(int key, Qt::KeyboardModifiers modifiers, bool inTextEntry = false);
+  // MSG_WLOPENTRADE: "17007" for origin -1; refused with "Counter is not
+  // Tradeable." when the instrument is not tradeable; else the shared path.
+  LRESULT OpenTradeTicket(const std::wstring* linkText, LPARAM origin) override;
   // Records the start parameters for the given instrument (-1, "" for none).
   void RecordStartParams(std::int64_t productId, const std::string& instrumentCode);
   // The title: language text of the class, "Cash " before it for products of
@@ -143,15 +141,28 @@ class CSingleInstrumentView : public CAddonView {
 
  protected:
   int OnCreate() override;
-  void OnActivate() override;
-  void OnDeactivate() override;
+  // Default: the shared sequences, logged under this file; views override
+  // them to call the sequences from their own file.
+  void OnActivate() override { ActivateInstrumentView(); }
+  void OnDeactivate() override { DeactivateInstrumentView(); }
   std::uint32_t OnViewMessage(UINT message, LPARAM data) override;
+  std::optional<std::wstring> ShortcutTicket(addon::TradeSide side) override;
+
+  // Host code 2: 102 with the preferred size, StartTimers(true),
+  // PrepareBasicData (logged at `where`), the display mode (519), the combo
+  // list, the columns, the language, the empty-state text, the explorer button.
+  void ActivateInstrumentView(std::source_location where = std::source_location::current());
+  // Host code 1: PrepareBasicData (logged at `where`), StartTimers(false).
+  void DeactivateInstrumentView(std::source_location where = std::source_location::current());
 
   // ---- Hooks for the derived view ----
   virtual CInstrumentGrid* CreateGrid() { return nullptr; }
   virtual void OnInstrumentSelected(const JInstrumentUnderlying& instrument) {}
+  virtual void RegisterShownInterest() {}
+  virtual void SendPendingInterest() {}
+  virtual void ExpireMarks(std::uint32_t now) {}
   virtual void OnRefreshTick() {}
-  virtual const char* RefusalKey() const { return "17001"; }
+  virtual void OnOtherTimer(UINT id) {}
   virtual std::wstring EmptyStateText() { return {}; }
   // Timers on 2 (activation = true) and 1. Default: the refresh timer both times.
   virtual void StartTimers(bool activation);
@@ -173,6 +184,9 @@ class CSingleInstrumentView : public CAddonView {
   bool SelectingFromStartParams() const { return m_fromStartParams; }
   // Shows `text` over the empty grid after clearing the view (refusals).
   void ClearWithMessage(const std::wstring& text);
+  // No instrument: nothing shown, no message, the class title, the combo
+  // box's placeholder, start parameters -1 and "".
+  void ClearInstrument();
   // The empty-state text while the grid has no rows, else nothing.
   void RefreshEmptyState();
   // Sends the title built by BuildTitle (101).
@@ -182,23 +196,19 @@ class CSingleInstrumentView : public CAddonView {
 
   void paintEvent(QPaintEvent* e) override;
   void resizeEvent(QResizeEvent* e) override;
-  void keyPressEvent(QKeyEvent* e) override;
-  bool eventFilter(QObject* watched, QEvent* event) override;
 
  private:
   void BuildControls();
-  void WatchKeys(QWidget* widget);
   void ReloadComboList();
   void SyncCombo();
   void OnComboChosen();
-  void OnExplorerClicked();
   void OnTabNotify(CTCNotify& notify);
   void EnsureTabs();
   void ReloadImages();
   void UpdateExplorerVisibility();
   std::wstring KindTitle(const CSuperBaseView* view) const;
-  std::wstring ProductTypeOf(const JInstrumentUnderlying& instrument) const;
-  bool CheckExchange(const JInstrumentUnderlying& instrument);
+  // Timer 3101: the store-feed rule, then OnRefreshTick.
+  void RefreshTick();
 
   addon::Membership m_user{addon::UserViews};
   CInstrumentComboBox* m_combo = nullptr;
@@ -210,9 +220,7 @@ class CSingleInstrumentView : public CAddonView {
   const std::vector<JInstrumentUnderlying>* m_instrumentList = nullptr;
   int m_accessStatus = 0;
   int m_saveSpace = 0;
-  std::set<std::string> m_enabledExchanges;
-  std::string m_checkingExchange;  // the exchange of the pending 604
-  const JInstrumentUnderlying* m_linkAnswer = nullptr;  // answer to 550/551
   bool m_fromStartParams = false;
-  const QEvent* m_textKeyEvent = nullptr;  // a key typed into the search box
+  bool m_wasCurrent = false;    // current at the last refresh tick
+  bool m_tickedBefore = false;  // a refresh tick has run
 };

@@ -1,6 +1,7 @@
 #include "views/instrument/SummaryFeed.h"
 
 #include <algorithm>
+#include <array>
 #include <cmath>
 #include <set>
 
@@ -9,11 +10,6 @@
 
 namespace summary {
 namespace {
-
-std::vector<PendingPage>& Queue() {
-  static std::vector<PendingPage> queue;
-  return queue;
-}
 
 // Splits at `sep`, keeping empty parts ("a||b" has three).
 std::vector<std::wstring_view> Split(std::wstring_view text, wchar_t sep) {
@@ -28,27 +24,24 @@ std::vector<std::wstring_view> Split(std::wstring_view text, wchar_t sep) {
   return parts;
 }
 
-bool HasText(const SummaryLineRecord* r) { return r && !(*r)[SummaryLineLayout::Price].text.empty(); }
+bool HasPrice(const SummaryLineRecord& r) { return !r[SummaryLineLayout::Price].text.empty(); }
+
+bool HeaderExists(const InstrumentKey& key) {
+  SummaryHeaderRecord probe;
+  return PageFeed::Instance().Read(key, probe);
+}
 
 }  // namespace
 
+LineRange::LineRange(const InstrumentKey& key, int first, int last)
+    : m_first{key.ProductID, key.InstrumentCode, std::max(first, 1)}, m_end(std::max(m_first.Line, last + 1)) {}
+
+LineRange::iterator LineRange::end() const { return iterator(LineKey{0, {}, m_end}); }
+
 void RegisterPage(const InstrumentKey& key, int page, std::uint32_t now) {
   if (key.InstrumentCode.empty() || page < kFirstPage || page > kLastPage) return;
-  SummaryHeaderStore& header = SummaryHeaderStore::Instance();
-  SummaryHeaderRecord probe;
-  if (!header.Peek(key, probe)) {
-    header.Get(key, now);
-    // Requests leave through this queue, not through the store's own list.
-    header.TakePending(std::set<InstrumentKey>{key});
-  }
-  PendingPage entry{key, page};
-  auto& queue = Queue();
-  if (std::find(queue.begin(), queue.end(), entry) == queue.end()) queue.push_back(std::move(entry));
+  PageFeed::Instance().Register(key, page, now);
 }
-
-std::vector<PendingPage> TakePending() { return std::exchange(Queue(), {}); }
-
-std::size_t PendingCount() { return Queue().size(); }
 
 std::vector<PageItem> ParsePage(std::wstring_view text, int page) {
   std::vector<PageItem> items;
@@ -72,28 +65,24 @@ std::vector<PageItem> ParsePage(std::wstring_view text, int page) {
 
 Applied ApplyUpdate(const FieldUpdate& update, std::uint32_t now) {
   const InstrumentKey key{update.productId, hv::Widen(update.instrumentCode)};
-  if (key.InstrumentCode.empty()) return Applied::Nothing;
+  if (key.InstrumentCode.empty() || !HeaderExists(key)) return Applied::Nothing;
   if (update.fieldName != "TRADEDATA") {
-    SummaryHeaderStore& header = SummaryHeaderStore::Instance();
+    SummaryHeaderStore& header = PageFeed::Instance().GetStore();
     const int field = SummaryHeaderStore::FieldIndex(hv::Widen(update.fieldName));
     if (field < 0) return Applied::Nothing;  // "QUOTE_LIST" and anything unknown
-    SummaryHeaderRecord probe;
-    if (!header.Peek(key, probe)) {
-      header.Get(key, now);
-      header.TakePending(std::set<InstrumentKey>{key});
-    }
     return header.Update(key, field, hv::Widen(update.value), now) ? Applied::Header : Applied::Nothing;
   }
   if (update.param < kFirstPage || update.param > kLastPage) return Applied::Nothing;
   const std::vector<PageItem> items = ParsePage(hv::Widen(update.value), update.param);
   if (items.empty()) return Applied::Nothing;
-  SummaryLineStore& lines = SummaryLineStore::Instance();
-  // Lines get their record when their first value arrives.
+  SummaryLineStore& lines = LineFeed::Instance().GetStore();
+  // Lines get their record when their first value arrives; they are answers,
+  // not requests, so they leave the store's pending list again.
   std::set<LineKey> created;
   for (const PageItem& item : items) {
     LineKey k{key.ProductID, key.InstrumentCode, item.line};
-    const bool known = lines.Read([&](const SummaryLineStore::Reader& r) { return r.Find(k) != nullptr; });
-    if (known) continue;
+    SummaryLineRecord probe;
+    if (lines.Peek(k, probe)) continue;
     lines.Get(k, now);
     created.insert(std::move(k));
   }
@@ -122,13 +111,10 @@ Applied ApplyUpdate(const FieldUpdate& update, std::uint32_t now) {
 
 int PageCount(const InstrumentKey& key) {
   if (key.InstrumentCode.empty()) return 0;
-  return SummaryHeaderStore::Instance().Read([&](const SummaryHeaderStore::Reader& r) {
-    const SummaryHeaderRecord* h = r.Find(key);
-    if (!h) return 0;
-    const QuoteCell& c = (*h)[SummaryHeaderLayout::PageCount];
-    if (c.text.empty() || !(c.value > 0.0)) return 0;
-    return c.value >= double(kLastPage) ? kLastPage : int(c.value);
-  });
+  QuoteCell c;
+  if (!PageFeed::Instance().ReadCell(key, SummaryHeaderLayout::PageCount, c)) return 0;
+  if (c.text.empty() || !(c.value > 0.0)) return 0;
+  return c.value >= double(kLastPage) ? kLastPage : int(c.value);
 }
 
 int LineLimit(const InstrumentKey& key) {
@@ -139,60 +125,33 @@ int LineLimit(const InstrumentKey& key) {
 Extent Recount(const InstrumentKey& key) {
   Extent extent;
   if (key.InstrumentCode.empty()) return extent;
-  const int limit = LineLimit(key);
-  std::uint64_t headerVersion = 0;
-  SummaryHeaderStore::Instance().Read([&](const SummaryHeaderStore::Reader& r) {
-    if (const SummaryHeaderRecord* h = r.Find(key)) headerVersion = h->version;
-  });
-  std::uint64_t linesVersion = 0;
-  SummaryLineStore::Instance().Read([&](const SummaryLineStore::Reader& r) {
-    LineKey k{key.ProductID, key.InstrumentCode, 0};
-    for (int line = 1; line <= limit; ++line) {
-      k.Line = line;
-      const SummaryLineRecord* rec = r.Find(k);
-      if (!HasText(rec)) break;
-      extent.filled = line;
-      linesVersion = std::max(linesVersion, rec->version);
-    }
-    k.Line = kTotalsLine;
-    if (const SummaryLineRecord* totals = r.Find(k)) linesVersion = std::max(linesVersion, totals->version);
-  });
-  // The two stores count their versions apart; their sum grows whenever
-  // either side changes.
-  extent.newestStamp = headerVersion + linesVersion;
+  const LineFeed& lines = LineFeed::Instance();
+  const auto run = lines.LeadingRun(LineRange(key, 1, LineLimit(key)), HasPrice);
+  extent.filled = run.count;
+  const std::uint64_t header = PageFeed::Instance().NewestStamp(std::array{key});
+  const std::uint64_t totals = lines.NewestStamp(std::array{LineKey{key.ProductID, key.InstrumentCode, kTotalsLine}});
+  extent.newestStamp = header + std::max(run.newestStamp, totals);
   return extent;
 }
 
 bool ReadLine(const InstrumentKey& key, int line, SummaryLineRecord& out) {
   if (key.InstrumentCode.empty()) return false;
-  return SummaryLineStore::Instance().Peek(LineKey{key.ProductID, key.InstrumentCode, line}, out);
+  return LineFeed::Instance().Read(LineKey{key.ProductID, key.InstrumentCode, line}, out);
 }
 
 bool ReadCell(const InstrumentKey& key, int line, int field, QuoteCell& out) {
-  if (key.InstrumentCode.empty() || field < 0 || field >= int(SummaryLineRecord::kCellCount)) return false;
-  return SummaryLineStore::Instance().Read([&](const SummaryLineStore::Reader& r) {
-    const SummaryLineRecord* rec = r.Find(LineKey{key.ProductID, key.InstrumentCode, line});
-    if (!rec) return false;
-    out = (*rec)[std::size_t(field)];
-    return true;
-  });
+  if (key.InstrumentCode.empty()) return false;
+  return LineFeed::Instance().ReadCell(LineKey{key.ProductID, key.InstrumentCode, line}, field, out);
 }
 
 std::uint64_t NewestVersion(const InstrumentKey& key, int first, int last) {
-  std::uint64_t newest = 0;
-  if (key.InstrumentCode.empty()) return newest;
-  first = std::max(first, 1);
-  last = std::min(last, kMaxLines);
-  SummaryLineStore::Instance().Read([&](const SummaryLineStore::Reader& r) {
-    LineKey k{key.ProductID, key.InstrumentCode, 0};
-    for (int line = first; line <= last; ++line) {
-      k.Line = line;
-      const SummaryLineRecord* rec = r.Find(k);
-      if (!HasText(rec)) break;
-      newest = std::max(newest, rec->version);
-    }
-  });
-  return newest;
+  if (key.InstrumentCode.empty()) return 0;
+  return LineFeed::Instance().LeadingRun(LineRange(key, first, std::min(last, kMaxLines)), HasPrice).newestStamp;
+}
+
+void ExpireMarks(std::uint32_t now) {
+  PageFeed::Instance().ExpireMarks(now);
+  LineFeed::Instance().ExpireMarks(now);
 }
 
 }  // namespace summary

@@ -1,24 +1,29 @@
 #pragma once
 // The trade-summary views' side of the process-wide SummaryHeaderStore and
-// SummaryLineStore: which pages of which instrument are wanted, the terminal's
-// values (410/412, kind 3) into the stores, and reading lines back without
-// creating anything.
+// SummaryLineStore (see addon/StoreFeed.h for the feed vocabulary).
+//
+//   PageFeed  SummaryHeaderStore; params: the page (1..99); record: the
+//             instrument's header. Registering a page makes the header record
+//             exist and queues {instrument, page}; the current view sends the
+//             page request for each pending entry.
+//   LineFeed  SummaryLineStore, for reading lines and expiring their marks.
+//             Nothing is registered here: how many lines there are is known only
+//             when they arrive, so ApplyUpdate makes their records.
 //
 // The terminal sends the summary as pages of up to 40 price lines: page p's
 // "TRADEDATA" text holds items separated by ";", each item fields separated
 // by "|": price, trades, volume, bid volume, (unused), ask volume. Item i of
 // page p (counted from 0 over all items of the text) is line (p-1)*40+1+i;
 // an item whose price is "TOTALS:" or empty is the totals line 99999.
-// Lines have no record until their first value arrives, so the writer
-// creates them; a registration creates the header record and queues the page
-// for the next refresh tick of the view that sends the requests.
 //
 // UI thread only (the stores themselves take their lock on every call).
 #include <cstdint>
+#include <iterator>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "addon/StoreFeed.h"
 #include "data/Keys.h"
 #include "data/MarketStores.h"
 
@@ -33,21 +38,56 @@ inline constexpr int kTotalsLine = 99999;
 // Lines are counted from 1 up to below 1000.
 inline constexpr int kMaxLines = 999;
 
-// One queued page request.
-struct PendingPage {
-  InstrumentKey key;
-  int page = 0;
+struct PageFeedTraits {
+  using Store = SummaryHeaderStore;
+  using Params = int;  // the page
+  static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, int) { return {key}; }
+};
+using PageFeed = addon::StoreFeed<PageFeedTraits>;
 
-  friend bool operator==(const PendingPage&, const PendingPage&) = default;
+struct LineFeedTraits {
+  using Store = SummaryLineStore;
+  using Params = addon::NoParams;
+  static std::vector<LineKey> RecordKeys(const InstrumentKey&, addon::NoParams) { return {}; }
+};
+using LineFeed = addon::StoreFeed<LineFeedTraits>;
+
+// Lines first..last of an instrument as store keys, made one at a time (a
+// recount walks up to 999 of them every refresh).
+class LineRange {
+ public:
+  class iterator {
+   public:
+    using value_type = LineKey;
+    using difference_type = std::ptrdiff_t;
+    using reference = const LineKey&;
+    using pointer = const LineKey*;
+    using iterator_category = std::input_iterator_tag;
+    iterator() = default;
+    explicit iterator(LineKey key) : m_key(std::move(key)) {}
+    const LineKey& operator*() const { return m_key; }
+    iterator& operator++() {
+      ++m_key.Line;
+      return *this;
+    }
+    bool operator!=(const iterator& other) const { return m_key.Line != other.m_key.Line; }
+    bool operator==(const iterator& other) const { return m_key.Line == other.m_key.Line; }
+
+   private:
+    LineKey m_key;
+  };
+  LineRange(const InstrumentKey& key, int first, int last);
+  iterator begin() const { return iterator(m_first); }
+  iterator end() const;
+
+ private:
+  LineKey m_first;
+  int m_end;  // one past the last line
 };
 
-// Queues page `page` (1..99) of `key` and makes sure the header record
-// exists. A page queued twice before it is taken leaves once. An empty code
-// or a page outside 1..99 is ignored.
+// Registers page `page` of `key` in the PageFeed; pages outside 1..99 and an
+// empty code are ignored.
 void RegisterPage(const InstrumentKey& key, int page, std::uint32_t now);
-// The queued pages in the order registered; the queue is emptied.
-std::vector<PendingPage> TakePending();
-std::size_t PendingCount();
 
 // Whether a 410/412 with this kind and param belongs to the summary views.
 inline bool IsSummaryParam(std::int32_t kind, std::int32_t param) {
@@ -67,7 +107,9 @@ std::vector<PageItem> ParsePage(std::wstring_view text, int page);
 enum class Applied { Nothing, Header, Lines };
 // Writes a terminal value into the stores: "TRADEDATA" becomes lines, any
 // other field goes to the header (fields the header does not keep change
-// nothing). The caller checks kind and param first (IsSummaryParam).
+// nothing). Values of an instrument no view registered (no header record)
+// are dropped, as in every store. The caller checks kind and param first
+// (IsSummaryParam).
 Applied ApplyUpdate(const FieldUpdate& update, std::uint32_t now);
 
 // The header's page count as a whole number; 0 when not known.
@@ -76,7 +118,9 @@ int PageCount(const InstrumentKey& key);
 int LineLimit(const InstrumentKey& key);
 
 // Lines 1.. up to the first line without a price text or beyond the limit,
-// with the newest change stamp of the header and those lines (0 when none).
+// and a change stamp of the header, those lines and the totals (0 when none of
+// them exists). The stamp adds the versions of two stores: it differs whenever
+// anything shown changed.
 struct Extent {
   int filled = 0;
   std::uint64_t newestStamp = 0;
@@ -91,5 +135,8 @@ bool ReadCell(const InstrumentKey& key, int line, int field, QuoteCell& out);
 // line without a price text); 0 when none. Tells whether lines changed since
 // a version seen before.
 std::uint64_t NewestVersion(const InstrumentKey& key, int first, int last);
+
+// Expires the marks of both stores.
+void ExpireMarks(std::uint32_t now);
 
 }  // namespace summary

@@ -9,4 +9,8 @@ class CTimeAndSalesAdv : public CSingleInstrumentView {
  public:
   CTimeAndSalesAdv();
   ~CTimeAndSalesAdv() override;
+
+ protected:
+  void OnActivate() override;
+  void OnDeactivate() override;
 };

@@ -3,7 +3,6 @@
 #include <algorithm>
 
 #include "addon/Channel.h"
-#include "addon/Registries.h"
 #include "hostview/NumberText.h"
 #include "hostview/Services.h"
 #include "hostview/StyleRoles.h"
@@ -27,18 +26,22 @@ std::int64_t WholeOf(const QuoteCell& cell) { return cell.text.empty() ? 0 : sta
 
 const addon::ViewClassInfo& CTradeSummaryAdv::Info() {
   static const addon::ViewClassInfo info{
-      "CTradeSummaryAdv",
-      "TradeSummaryAdv.cpp",
-      10,
-      L"Trade Summary",
-      {},
-      {addon::RefStore::Products, addon::RefStore::Instruments},
+      .className = "CTradeSummaryAdv",
+      .titleEntry = 10,
+      .defaultTitle = L"Trade Summary",
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .refusalKey = "17003",
+      .dropSources = addon::kInstrumentViewSources,
+      .descriptor = &classCTradeSummaryAdv,
   };
   return info;
 }
 
 CTradeSummaryAdv::CTradeSummaryAdv() : CSingleInstrumentView(Info()) {}
 CTradeSummaryAdv::~CTradeSummaryAdv() = default;
+
+void CTradeSummaryAdv::OnActivate() { ActivateInstrumentView(); }
+void CTradeSummaryAdv::OnDeactivate() { DeactivateInstrumentView(); }
 
 // ---- Creation and layout ----------------------------------------------------------
 
@@ -106,9 +109,8 @@ void CTradeSummaryAdv::StartTimers(bool) {
   platform::SetTimer(this, kPageCountTimer, kPageCountMs);
 }
 
-void CTradeSummaryAdv::OnTimer(UINT id) {
+void CTradeSummaryAdv::OnOtherTimer(UINT id) {
   if (id == kPageCountTimer) CheckPageCount();
-  else CSingleInstrumentView::OnTimer(id);
 }
 
 void CTradeSummaryAdv::CheckPageCount() {
@@ -116,39 +118,25 @@ void CTradeSummaryAdv::CheckPageCount() {
   m_summaryGrid->RegisterPagesUpTo(summary::PageCount(m_summaryGrid->Instrument()));
 }
 
-void CTradeSummaryAdv::ResubscribeAll() {
-  for (CSuperBaseView* view : addon::UserViews().Views()) {
-    auto* other = dynamic_cast<CTradeSummaryAdv*>(view);
-    if (!other || !other->m_summaryGrid) continue;
-    const InstrumentKey& key = other->m_summaryGrid->Instrument();
-    if (key.InstrumentCode.empty()) continue;
-    const std::uint32_t now = platform::TickCount();
-    for (int page = 1; page <= other->m_summaryGrid->RegisteredPages(); ++page) summary::RegisterPage(key, page, now);
+void CTradeSummaryAdv::RegisterShownInterest() {
+  if (!m_summaryGrid) return;
+  const InstrumentKey& key = m_summaryGrid->Instrument();
+  const std::uint32_t now = platform::TickCount();
+  for (int page = 1; page <= m_summaryGrid->RegisteredPages(); ++page) summary::RegisterPage(key, page, now);
+}
+
+void CTradeSummaryAdv::SendPendingInterest() {
+  const addon::FeedbackSender send = Sender();
+  for (const auto& pending : summary::PageFeed::Instance().TakePending()) {
+    const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
+    addon::SendRequestBatch(send, target, addon::fields::kSummary, addon::BatchTag{summary::kKind, pending.params});
   }
 }
 
+void CTradeSummaryAdv::ExpireMarks(std::uint32_t now) { summary::ExpireMarks(now); }
+
 void CTradeSummaryAdv::OnRefreshTick() {
-  const bool current = IsCurrentRegistration();
-  // The current view, the one that applies pushed values, asks for every
-  // trade-summary view; when it closes, its successor asks again.
-  if (current && m_tickedBefore && !m_wasCurrent) ResubscribeAll();
-  m_wasCurrent = current;
-  m_tickedBefore = true;
-  // 1. Page requests wanted since the last tick.
-  if (current) {
-    const addon::FeedbackSender send = Sender();
-    for (const summary::PendingPage& pending : summary::TakePending()) {
-      const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
-      addon::SendRequestBatch(send, target, addon::fields::kSummary, addon::BatchTag{summary::kKind, pending.page});
-    }
-  }
-  // 2. Marks age once, by the current view.
-  if (current) {
-    const std::uint32_t now = platform::TickCount();
-    SummaryHeaderStore::Instance().ExpireMarks(now);
-    SummaryLineStore::Instance().ExpireMarks(now);
-  }
-  // 3. Redraw when something moved since the last drawing.
+  // Redraw when something moved since the last drawing.
   if (!m_summaryGrid) return;
   const std::uint64_t stamp = m_summaryGrid->NewestStamp();
   const int filled = m_summaryGrid->FilledLines();

@@ -10,13 +10,11 @@
 // SummaryLineStore that all trade-summary views share. A 410 is applied by
 // the current trade-summary view only (the first of its class in the user
 // registry), a 412 by every view; an empty 412 is asked again with 400.
-// The current view also sends the page requests of every trade-summary view,
-// so that a terminal that pushes values to the asking view only still reaches
-// the view that applies them; when it closes, its successor asks again.
+// Page requests go through SummaryFeed under the base's current-view rule.
 //
-// Timer 3101 (200 ms): pending page requests, mark expiry (current view),
-// then a redraw when the table's newest stamp moved, and a chart rebuild on
-// the first rows or when a line in the chart's window changed.
+// Timer 3101 (200 ms): pending page requests and mark expiry (current view,
+// by the base), then a redraw when the table's newest stamp moved, and a
+// chart rebuild on the first rows or when a line in the chart's window changed.
 #include <cstdint>
 #include <string>
 
@@ -54,15 +52,19 @@ class CTradeSummaryAdv : public CSingleInstrumentView {
   // The chart group of one line (label, ask, bid, trades, tooltip).
   static CBarChart::Group ChartGroupOf(const SummaryLineRecord& line);
 
-  void OnTimer(UINT id) override;
   void SetStyleManager(IStyleManager* styleManager) override;
 
  protected:
+  void OnActivate() override;
+  void OnDeactivate() override;
   int OnCreate() override;
   CInstrumentGrid* CreateGrid() override;
   void OnInstrumentSelected(const JInstrumentUnderlying& instrument) override;
+  void RegisterShownInterest() override;
+  void SendPendingInterest() override;
+  void ExpireMarks(std::uint32_t now) override;
   void OnRefreshTick() override;
-  const char* RefusalKey() const override { return "17003"; }
+  void OnOtherTimer(UINT id) override;
   std::wstring EmptyStateText() override;
   void StartTimers(bool activation) override;
   void ShowRefusedColumns() override;
@@ -72,8 +74,6 @@ class CTradeSummaryAdv : public CSingleInstrumentView {
  private:
   void ApplyFieldUpdate(const FieldUpdate& update, UINT message);
   void CheckPageCount();
-  // Registers the pages of every open trade-summary view again.
-  void ResubscribeAll();
   bool ChartWindowChanged() const;
   void FollowGrid(int topRow);
   void FollowChart(int first);
@@ -85,7 +85,5 @@ class CTradeSummaryAdv : public CSingleInstrumentView {
   int m_lastFilled = 0;
   bool m_rowsShown = false;         // rows appeared for this instrument (one-shot)
   std::uint64_t m_chartVersion = 0; // newest line version in the chart's window when built
-  bool m_wasCurrent = false;
-  bool m_tickedBefore = false;
   bool m_following = false;         // grid and chart are being lined up
 };

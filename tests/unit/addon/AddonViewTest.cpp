@@ -16,9 +16,16 @@ class CTestView : public CAddonView {
   CTestView() : CAddonView(Info()) {}
   static const addon::ViewClassInfo& Info() {
     static const addon::ViewClassInfo info{
-        "CTestView", "TestView.cpp", 5, L"Test", {{hm::SystemParameter, "MAXWL"}, {hm::NoticeParameter, "WLNOT"}},
+        "CTestView", 5, L"Test", {{hm::SystemParameter, "MAXWL"}, {hm::NoticeParameter, "WLNOT"}},
         {addon::RefStore::Products, addon::RefStore::UserWatchlists}};
     return info;
+  }
+  // Activation as a view writes it: the log names this file and this line.
+  static inline int activateLine = 0;
+  void OnActivate() override {
+    activateLine = __LINE__ + 1;
+    PrepareBasicData();
+    SetActiveFlag(true);
   }
   std::uint32_t OnViewMessage(UINT message, LPARAM data) override {
     seen.push_back(message);
@@ -137,10 +144,14 @@ TEST_F(AddonViewTest, PrepareBasicData_FirstTimePerClassAsksSettingsThenMissingS
   host.Send(Make(), hm::Activate);
   EXPECT_TRUE(host.Requests().empty());  // later runs of the class ask nothing
 
-  // Logged at the start and the end, under the class name.
+  // Logged at the start and the end, under the class name, with the file and
+  // line of the view's own call.
   const auto lines = host.logs.Texts();
   ASSERT_GE(lines.size(), 2u);
-  EXPECT_EQ(lines[0].rfind("Info:CTestView::PrepareBasicData file:TestView.cpp line:", 0), 0u) << lines[0];
+  const std::string expected =
+      "Info:CTestView::PrepareBasicData file:AddonViewTest.cpp line:" + std::to_string(CTestView::activateLine);
+  EXPECT_EQ(lines[0], expected);
+  EXPECT_EQ(lines[1], expected);
   EXPECT_EQ(host.logs.lines[0].level, 3);
 }
 

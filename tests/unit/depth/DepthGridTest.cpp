@@ -10,7 +10,7 @@
 #include "addon/RegisteredMessages.h"
 #include "data/MarketStores.h"
 #include "mvtest/ScriptedHost.h"
-#include "views/instrument/DepthFeed.h"
+#include "addon/Feeds.h"
 #include "views/instrument/DepthGrid.h"
 
 namespace {
@@ -234,20 +234,21 @@ TEST_F(DepthGridTest, Cursor_HandOverPricesOnly) {
 }
 
 TEST_F(DepthGridTest, Registration_QueuesOncePerCountAndReadsCreateNothing) {
-  EXPECT_EQ(depth::PendingCount(), 1u);
+  auto& feed = addon::DepthFeed::Instance();
+  EXPECT_EQ(feed.PendingCount(), 1u);
   grid->SetLevelCount(5);  // the same pair again
-  EXPECT_EQ(depth::PendingCount(), 1u);
+  EXPECT_EQ(feed.PendingCount(), 1u);
   grid->SetLevelCount(21);
-  const auto pending = depth::TakePending();
+  const auto pending = feed.TakePending();
   ASSERT_EQ(pending.size(), 2u);
-  EXPECT_EQ(pending[0].levelCount, 5);
-  EXPECT_EQ(pending[1].levelCount, 21);
+  EXPECT_EQ(pending[0].params, 5);
+  EXPECT_EQ(pending[1].params, 21);
   EXPECT_EQ(DepthStore::Instance().PendingCount(), 0u);
   const std::size_t records = DepthStore::Instance().Size();
   EXPECT_EQ(records, 21u);
   grid->NewestStamp();
   DepthRecord r;
-  EXPECT_FALSE(depth::ReadLevel(key, 22, r));
+  EXPECT_FALSE(feed.Read(DepthKey{key.ProductID, key.InstrumentCode, 22}, r));
   EXPECT_EQ(DepthStore::Instance().Size(), records);
 }
 

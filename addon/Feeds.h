@@ -1,0 +1,39 @@
+#pragma once
+// The store feeds of the views (see addon/StoreFeed.h for the vocabulary).
+//
+//   DepthFeed   DepthStore; params: the number of levels (1..99); records:
+//               levels 1..count of the instrument. The depth view sends the
+//               three depth batches for each pending interest.
+//   QuoteFeed   QuoteStore; no params; record: the instrument's quote record.
+//               The price view and the alert views register what they show
+//               and send the quote batches for what TakePending(shown) hands out;
+//               registering a shown instrument again asks for it again.
+#include <vector>
+
+#include "addon/StoreFeed.h"
+#include "data/MarketStores.h"
+#include "data/QuoteStore.h"
+
+namespace addon {
+
+struct DepthFeedTraits {
+  using Store = DepthStore;
+  using Params = int;  // levels wanted
+  static constexpr int kMinLevels = 1;
+  static constexpr int kMaxLevels = 99;
+  static int Normalise(int levels);
+  static std::vector<DepthKey> RecordKeys(const InstrumentKey& key, int levels);
+};
+using DepthFeed = StoreFeed<DepthFeedTraits>;
+
+// Levels first..last (clamped to 1..99) of an instrument, in order.
+std::vector<DepthKey> DepthLevels(const InstrumentKey& key, int first, int last);
+
+struct QuoteFeedTraits {
+  using Store = QuoteStore;
+  using Params = NoParams;
+  static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, NoParams) { return {key}; }
+};
+using QuoteFeed = StoreFeed<QuoteFeedTraits>;
+
+}  // namespace addon
