@@ -16,6 +16,7 @@
 #include "platform/Platform.h"
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
+#include "terminal/app/MarketSummaryDump.h"
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/SettingsDialog.h"
 #include "terminal/sim/Market.h"
@@ -33,6 +34,10 @@ const QStringList kAddonClasses = {"CPriceViewAdv",   "CMarketDepthAdv",   "CTim
                                    "CTradeSummaryAdv", "CPriceAlertList",  "CNewPriceAlertAdv"};
 constexpr int kPumpMs = 50;
 constexpr double kDefaultHeadlessSeconds = 10;
+// Before dumps and snapshots the views catch up with a market that stands
+// still: long enough for a page count noticed once a second to be asked for
+// and drawn.
+constexpr int kSettleMs = 1500;
 constexpr int kAutosaveMs = 60 * 1000;
 
 StartParamMap Widen(const std::map<std::string, std::string>& in) {
@@ -325,6 +330,7 @@ int TerminalApp::RunTimed() {
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }
+  if (!m_options.dumpDir.empty() || !m_options.snapshotDir.empty()) SettleViews();
   int code = 0;
   if (!SaveLayout()) code = 1;
   std::string error;
@@ -340,6 +346,17 @@ int TerminalApp::RunTimed() {
   }
   Shutdown();
   return code;
+}
+
+void TerminalApp::SettleViews() {
+  auto& clock = platform::UseVirtualClock();
+  const std::uint32_t marketTick = clock.Now();
+  for (int waited = 0; waited < kSettleMs && !m_shutDown && !m_stopRequested; waited += kPumpMs) {
+    clock.Advance(kPumpMs);
+    m_runtime->Pump(marketTick);  // answers and pushes, but no market step
+    platform::ProcessPosted();
+    QCoreApplication::processEvents();
+  }
 }
 
 int TerminalApp::DumpGrids(const std::string& dir, std::string& error) {
@@ -360,6 +377,14 @@ int TerminalApp::DumpGrids(const std::string& dir, std::string& error) {
       ++files;
     }
   }
+  // The market's own volume by price for every instrument a trade summary shows.
+  std::vector<std::pair<std::int64_t, std::string>> summaries;
+  for (ViewDock* d : m_window->Docks())
+    if (d->ClassName() == QLatin1String("CTradeSummaryAdv"))
+      summaries.emplace_back(d->View()->GetStartProductId(), d->View()->GetStartInstrumentCode());
+  const int market = WriteMarketSummaryDumps(dir, m_runtime->Market(), summaries, error);
+  if (market < 0) return -1;
+  files += market;
   return files;
 }
 
