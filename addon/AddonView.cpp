@@ -265,6 +265,14 @@ void CAddonView::keyPressEvent(QKeyEvent* e) {
 
 // ---- Texts, titles, messages, logs ---------------------------------------------------
 
+std::wstring CAddonView::StyleImagePath(std::wstring path) const {
+  static const std::wstring kPlaceholder = L"[styleID]";
+  const std::wstring id = std::to_wstring(m_styleId);
+  for (std::size_t at = path.find(kPlaceholder); at != std::wstring::npos; at = path.find(kPlaceholder, at + id.size()))
+    path.replace(at, kPlaceholder.size(), id);
+  return path;
+}
+
 std::wstring CAddonView::LanguageText(int entry) const {
   return m_pLanguage ? m_pLanguage->GetText(addon::kLanguageSection, entry) : std::wstring();
 }
@@ -325,6 +333,11 @@ void CAddonView::PrepareBasicData(std::source_location where) {
 }
 
 bool CAddonView::HasPreparedClass(const std::string& className) { return PreparedClasses().count(className) != 0; }
+
+void CAddonView::ResetProcessState() {
+  PreparedClasses().clear();
+  ProcessDisplayMode() = 0;
+}
 
 void CAddonView::SendViewSize(int width, int height) {
   ViewSize size;

@@ -1031,6 +1031,16 @@ std::string Market::SummaryPageText(int index, int page) {
   return out;
 }
 
+std::string Market::DepthFieldValue(int index, const DepthLevel& L, std::string_view f) const {
+  if (f == "BUY") return L.bid > 0 ? FormatPrice(index, L.bid) : std::string();
+  if (f == "SELL") return L.ask > 0 ? FormatPrice(index, L.ask) : std::string();
+  if (f == "BVOL") return L.bid > 0 ? std::to_string(L.bidVolume) : std::string();
+  if (f == "SVOL") return L.ask > 0 ? std::to_string(L.askVolume) : std::string();
+  if (f == "ORDS_BVOL") return L.bid > 0 ? std::to_string(L.bidOrders) : std::string();
+  if (f == "ORDS_SVOL") return L.ask > 0 ? std::to_string(L.askOrders) : std::string();
+  return {};
+}
+
 std::string Market::FieldValue(int index, std::string_view f, int param, int kind) {
   if (index < 0 || index >= int(d->instruments.size())) return {};
   const int b = d->Base(index);
@@ -1040,14 +1050,7 @@ std::string Market::FieldValue(int index, std::string_view f, int param, int kin
     if (kind == 1 || f == "BUY" || f == "SELL" || f == "ORDS_BVOL" || f == "ORDS_SVOL") {
       const int level = kind == 1 ? param : 1;
       if (level < 1 || level > kDepthLevels) return {};
-      const DepthLevel L = Depth(index, level);
-      if (f == "BUY") return price(L.bid);
-      if (f == "SELL") return price(L.ask);
-      if (f == "BVOL") return L.bid > 0 ? std::to_string(L.bidVolume) : std::string();
-      if (f == "SVOL") return L.ask > 0 ? std::to_string(L.askVolume) : std::string();
-      if (f == "ORDS_BVOL") return L.bid > 0 ? std::to_string(L.bidOrders) : std::string();
-      if (f == "ORDS_SVOL") return L.ask > 0 ? std::to_string(L.askOrders) : std::string();
-      return {};
+      return DepthFieldValue(index, Depth(index, level), f);
     }
     if (f == "BID") return price(s.bid);
     if (f == "ASK") return price(s.ask);

@@ -150,6 +150,10 @@ class Market {
   // of page `param`; kind 3: trade-summary header fields or "TRADEDATA" of
   // summary page `param`.
   std::string FieldValue(int index, std::string_view field, int param, int kind);
+  // A depth field ("BUY", "SELL", "BVOL", "SVOL", "ORDS_BVOL", "ORDS_SVOL") of
+  // one book level of instrument `index`; "" for an empty side or another
+  // field. FieldValue and the host's depth pushes both format through here.
+  std::string DepthFieldValue(int index, const DepthLevel& level, std::string_view field) const;
 
   // Text layouts.
   std::string TradePageText(int index, int page);    // "TRADEDATA" of a page (1..999, 99998)

@@ -81,6 +81,13 @@ class CSingleInstrumentView : public CAddonView {
   explicit CSingleInstrumentView(const addon::ViewClassInfo& info);
   ~CSingleInstrumentView() override;
 
+  // The class data every single-instrument view shares: products and
+  // instruments asked for first, the instrument views as drop sources; the
+  // title entry, default title and exchange refusal key are the class's own.
+  static addon::ViewClassInfo InstrumentClassInfo(const char* className, const CRuntimeClass* descriptor,
+                                                  int titleEntry, const wchar_t* defaultTitle,
+                                                  const char* refusalKey);
+
   // ---- Registration ----
   // Handed out by the user registry at creation, returned at destruction.
   int RegistrationValue() const { return m_user.Id(); }

@@ -3,15 +3,8 @@
 ADDON_IMPLEMENT_VIEW(CTimeAndSalesAdv)
 
 const addon::ViewClassInfo& CTimeAndSalesAdv::Info() {
-  static const addon::ViewClassInfo info{
-      .className = "CTimeAndSalesAdv",
-      .titleEntry = 8,
-      .defaultTitle = L"Time and Sales",
-      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
-      .refusalKey = "17002",
-      .dropSources = addon::kInstrumentViewSources,
-      .descriptor = &classCTimeAndSalesAdv,
-  };
+  static const addon::ViewClassInfo info =
+      InstrumentClassInfo("CTimeAndSalesAdv", &classCTimeAndSalesAdv, 8, L"Time and Sales", "17002");
   return info;
 }
 

@@ -25,15 +25,8 @@ std::int64_t WholeOf(const QuoteCell& cell) { return cell.text.empty() ? 0 : sta
 }  // namespace
 
 const addon::ViewClassInfo& CTradeSummaryAdv::Info() {
-  static const addon::ViewClassInfo info{
-      .className = "CTradeSummaryAdv",
-      .titleEntry = 10,
-      .defaultTitle = L"Trade Summary",
-      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
-      .refusalKey = "17003",
-      .dropSources = addon::kInstrumentViewSources,
-      .descriptor = &classCTradeSummaryAdv,
-  };
+  static const addon::ViewClassInfo info =
+      InstrumentClassInfo("CTradeSummaryAdv", &classCTradeSummaryAdv, 10, L"Trade Summary", "17003");
   return info;
 }
 

@@ -45,6 +45,7 @@ struct DepthGridTest : ::testing::Test {
   const InstrumentKey key{7, L"D05"};
 
   void SetUp() override {
+    addon::DepthFeed::Instance().Reset();
     parent.resize(500, 400);
     grid = new TestGrid(&parent);
     grid->resize(400, 300);

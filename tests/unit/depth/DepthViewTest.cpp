@@ -483,6 +483,29 @@ TEST_F(DepthView, StartParams_UnknownInstrumentClearsAndMalformedIsIgnored) {
   EXPECT_EQ(view->GetStartInstrumentCode(), "");
 }
 
+TEST_F(DepthView, StartParams_UnknownInstrumentClearsTheShownBook) {
+  CMarketDepthAdv* view = Make();
+  const JInstrumentUnderlying& shown = instruments[0];
+  Select(view, shown);
+  for (int level : {0, 1, 2, 3}) {
+    if (level > 0) PushLevel(view, shown, level);
+    host.Advance(200);
+  }
+  ASSERT_EQ(view->GetDepthGrid()->GetNumberRows(), 3);
+
+  host.SendLink(view, LinkFor(Instrument(9, "NOPE", "SGX")));
+  EXPECT_EQ(view->CurrentInstrument(), nullptr);
+  EXPECT_EQ(view->GetDepthGrid()->GetNumberRows(), 0);
+  EXPECT_EQ(view->GetDepthGrid()->GetMessage(), L"");
+  EXPECT_EQ(view->GetTitle(), L"Market Depth");  // no instrument named
+  EXPECT_EQ(view->GetStartProductId(), -1);
+  // The old book goes on updating in the store, but no longer shows here.
+  PushLevel(view, shown, 4);
+  host.Advance(400);
+  EXPECT_EQ(view->GetDepthGrid()->GetNumberRows(), 0);
+  EXPECT_EQ(Dump(view).size(), 1u);  // headings only
+}
+
 TEST_F(DepthView, Title_CashForDmaAndFollowsTheLanguage) {
   CMarketDepthAdv* view = Make();
   Select(view, instruments[5]);
