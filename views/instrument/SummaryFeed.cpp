@@ -28,7 +28,7 @@ bool HasPrice(const SummaryLineRecord& r) { return !r[SummaryLineLayout::Price].
 
 bool HeaderExists(const InstrumentKey& key) {
   SummaryHeaderRecord probe;
-  return PageFeed::Instance().Read(key, probe);
+  return addon::SummaryPageFeed::Instance().Read(key, probe);
 }
 
 }  // namespace
@@ -40,7 +40,7 @@ LineRange::iterator LineRange::end() const { return iterator(LineKey{0, {}, m_en
 
 void RegisterPage(const InstrumentKey& key, int page, std::uint32_t now) {
   if (key.InstrumentCode.empty() || page < kFirstPage || page > kLastPage) return;
-  PageFeed::Instance().Register(key, page, now);
+  addon::SummaryPageFeed::Instance().Register(key, page, now);
 }
 
 std::vector<PageItem> ParsePage(std::wstring_view text, int page) {
@@ -67,7 +67,7 @@ Applied ApplyUpdate(const FieldUpdate& update, std::uint32_t now) {
   const InstrumentKey key{update.productId, hv::Widen(update.instrumentCode)};
   if (key.InstrumentCode.empty() || !HeaderExists(key)) return Applied::Nothing;
   if (update.fieldName != "TRADEDATA") {
-    SummaryHeaderStore& header = PageFeed::Instance().GetStore();
+    SummaryHeaderStore& header = addon::SummaryPageFeed::Instance().GetStore();
     const int field = SummaryHeaderStore::FieldIndex(hv::Widen(update.fieldName));
     if (field < 0) return Applied::Nothing;  // "QUOTE_LIST" and anything unknown
     return header.Update(key, field, hv::Widen(update.value), now) ? Applied::Header : Applied::Nothing;
@@ -75,7 +75,7 @@ Applied ApplyUpdate(const FieldUpdate& update, std::uint32_t now) {
   if (update.param < kFirstPage || update.param > kLastPage) return Applied::Nothing;
   const std::vector<PageItem> items = ParsePage(hv::Widen(update.value), update.param);
   if (items.empty()) return Applied::Nothing;
-  SummaryLineStore& lines = LineFeed::Instance().GetStore();
+  SummaryLineStore& lines = addon::SummaryLineFeed::Instance().GetStore();
   // Lines get their record when their first value arrives; they are answers,
   // not requests, so they leave the store's pending list again.
   std::set<LineKey> created;
@@ -112,7 +112,7 @@ Applied ApplyUpdate(const FieldUpdate& update, std::uint32_t now) {
 int PageCount(const InstrumentKey& key) {
   if (key.InstrumentCode.empty()) return 0;
   QuoteCell c;
-  if (!PageFeed::Instance().ReadCell(key, SummaryHeaderLayout::PageCount, c)) return 0;
+  if (!addon::SummaryPageFeed::Instance().ReadCell(key, SummaryHeaderLayout::PageCount, c)) return 0;
   if (c.text.empty() || !(c.value > 0.0)) return 0;
   return c.value >= double(kLastPage) ? kLastPage : int(c.value);
 }
@@ -125,10 +125,10 @@ int LineLimit(const InstrumentKey& key) {
 Extent Recount(const InstrumentKey& key) {
   Extent extent;
   if (key.InstrumentCode.empty()) return extent;
-  const LineFeed& lines = LineFeed::Instance();
+  const addon::SummaryLineFeed& lines = addon::SummaryLineFeed::Instance();
   const auto run = lines.LeadingRun(LineRange(key, 1, LineLimit(key)), HasPrice);
   extent.filled = run.count;
-  const std::uint64_t header = PageFeed::Instance().NewestStamp(std::array{key});
+  const std::uint64_t header = addon::SummaryPageFeed::Instance().NewestStamp(std::array{key});
   const std::uint64_t totals = lines.NewestStamp(std::array{LineKey{key.ProductID, key.InstrumentCode, kTotalsLine}});
   extent.newestStamp = header + std::max(run.newestStamp, totals);
   return extent;
@@ -136,22 +136,22 @@ Extent Recount(const InstrumentKey& key) {
 
 bool ReadLine(const InstrumentKey& key, int line, SummaryLineRecord& out) {
   if (key.InstrumentCode.empty()) return false;
-  return LineFeed::Instance().Read(LineKey{key.ProductID, key.InstrumentCode, line}, out);
+  return addon::SummaryLineFeed::Instance().Read(LineKey{key.ProductID, key.InstrumentCode, line}, out);
 }
 
 bool ReadCell(const InstrumentKey& key, int line, int field, QuoteCell& out) {
   if (key.InstrumentCode.empty()) return false;
-  return LineFeed::Instance().ReadCell(LineKey{key.ProductID, key.InstrumentCode, line}, field, out);
+  return addon::SummaryLineFeed::Instance().ReadCell(LineKey{key.ProductID, key.InstrumentCode, line}, field, out);
 }
 
 std::uint64_t NewestVersion(const InstrumentKey& key, int first, int last) {
   if (key.InstrumentCode.empty()) return 0;
-  return LineFeed::Instance().LeadingRun(LineRange(key, first, std::min(last, kMaxLines)), HasPrice).newestStamp;
+  return addon::SummaryLineFeed::Instance().LeadingRun(LineRange(key, first, std::min(last, kMaxLines)), HasPrice).newestStamp;
 }
 
 void ExpireMarks(std::uint32_t now) {
-  PageFeed::Instance().ExpireMarks(now);
-  LineFeed::Instance().ExpireMarks(now);
+  addon::SummaryPageFeed::Instance().ExpireMarks(now);
+  addon::SummaryLineFeed::Instance().ExpireMarks(now);
 }
 
 }  // namespace summary

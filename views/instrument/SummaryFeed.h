@@ -1,14 +1,8 @@
 #pragma once
 // The trade-summary views' side of the process-wide SummaryHeaderStore and
-// SummaryLineStore (see addon/StoreFeed.h for the feed vocabulary).
-//
-//   PageFeed  SummaryHeaderStore; params: the page (1..99); record: the
-//             instrument's header. Registering a page makes the header record
-//             exist and queues {instrument, page}; the current view sends the
-//             page request for each pending entry.
-//   LineFeed  SummaryLineStore, for reading lines and expiring their marks.
-//             Nothing is registered here: how many lines there are is known only
-//             when they arrive, so ApplyUpdate makes their records.
+// SummaryLineStore, on addon::SummaryPageFeed and addon::SummaryLineFeed
+// (addon/Feeds.h): pages wanted, the terminal's values into the stores, and
+// reading lines back without creating anything.
 //
 // The terminal sends the summary as pages of up to 40 price lines: page p's
 // "TRADEDATA" text holds items separated by ";", each item fields separated
@@ -23,7 +17,7 @@
 #include <string_view>
 #include <vector>
 
-#include "addon/StoreFeed.h"
+#include "addon/Feeds.h"
 #include "data/Keys.h"
 #include "data/MarketStores.h"
 
@@ -37,20 +31,6 @@ inline constexpr std::int32_t kHeaderParam = 99999;
 inline constexpr int kTotalsLine = 99999;
 // Lines are counted from 1 up to below 1000.
 inline constexpr int kMaxLines = 999;
-
-struct PageFeedTraits {
-  using Store = SummaryHeaderStore;
-  using Params = int;  // the page
-  static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, int) { return {key}; }
-};
-using PageFeed = addon::StoreFeed<PageFeedTraits>;
-
-struct LineFeedTraits {
-  using Store = SummaryLineStore;
-  using Params = addon::NoParams;
-  static std::vector<LineKey> RecordKeys(const InstrumentKey&, addon::NoParams) { return {}; }
-};
-using LineFeed = addon::StoreFeed<LineFeedTraits>;
 
 // Lines first..last of an instrument as store keys, made one at a time (a
 // recount walks up to 999 of them every refresh).
@@ -85,7 +65,7 @@ class LineRange {
   int m_end;  // one past the last line
 };
 
-// Registers page `page` of `key` in the PageFeed; pages outside 1..99 and an
+// Registers page `page` of `key` in the SummaryPageFeed; pages outside 1..99 and an
 // empty code are ignored.
 void RegisterPage(const InstrumentKey& key, int page, std::uint32_t now);
 

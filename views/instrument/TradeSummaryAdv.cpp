@@ -120,7 +120,7 @@ void CTradeSummaryAdv::RegisterShownInterest() {
 
 void CTradeSummaryAdv::SendPendingInterest() {
   const addon::FeedbackSender send = Sender();
-  for (const auto& pending : summary::PageFeed::Instance().TakePending()) {
+  for (const auto& pending : addon::SummaryPageFeed::Instance().TakePending()) {
     const addon::FieldTarget target{pending.key.ProductID, hv::Narrow(pending.key.InstrumentCode)};
     addon::SendRequestBatch(send, target, addon::fields::kSummary, addon::BatchTag{summary::kKind, pending.params});
   }

@@ -15,9 +15,9 @@ struct SummaryFeedTest : ::testing::Test {
   // The instrument is wanted (its header record exists); the queue starts empty.
   void SetUp() override {
     summary::RegisterPage(key, 1, host.clock.Now());
-    summary::PageFeed::Instance().Reset();
+    addon::SummaryPageFeed::Instance().Reset();
   }
-  void TearDown() override { summary::PageFeed::Instance().Reset(); }
+  void TearDown() override { addon::SummaryPageFeed::Instance().Reset(); }
 
   summary::Applied Apply(const std::string& field, const std::string& value, int param = 1) {
     FieldUpdate u{ins.productId, ins.instrumentCode, field, value, param, 3};
@@ -140,11 +140,11 @@ TEST_F(SummaryFeedTest, Register_QueuesEachPageOnceAndCreatesTheHeader) {
   summary::RegisterPage(key, 0, host.clock.Now());
   summary::RegisterPage(key, 100, host.clock.Now());
   summary::RegisterPage(InstrumentKey{1, L""}, 1, host.clock.Now());
-  const auto pending = summary::PageFeed::Instance().TakePending();
+  const auto pending = addon::SummaryPageFeed::Instance().TakePending();
   ASSERT_EQ(pending.size(), 2u);
-  EXPECT_EQ(pending[0], (summary::PageFeed::Pending{key, 1}));
-  EXPECT_EQ(pending[1], (summary::PageFeed::Pending{key, 2}));
-  EXPECT_EQ(summary::PageFeed::Instance().PendingCount(), 0u);
+  EXPECT_EQ(pending[0], (addon::SummaryPageFeed::Pending{key, 1}));
+  EXPECT_EQ(pending[1], (addon::SummaryPageFeed::Pending{key, 2}));
+  EXPECT_EQ(addon::SummaryPageFeed::Instance().PendingCount(), 0u);
   EXPECT_TRUE(SummaryHeaderStore::Instance().Peek(key, header));
   EXPECT_EQ(SummaryHeaderStore::Instance().PendingCount(), 0u);
 

@@ -76,10 +76,10 @@ struct SummaryFixture : ::testing::Test {
   };
 
   // Page requests queued by a test are the process's: none may leak into the next.
-  void TearDown() override { summary::PageFeed::Instance().Reset(); }
+  void TearDown() override { addon::SummaryPageFeed::Instance().Reset(); }
 
   void SetUp() override {
-    summary::PageFeed::Instance().TakePending();
+    addon::SummaryPageFeed::Instance().TakePending();
     host.AnswerValue(hm::ExchangeEnabled, 1);
     host.style.colors[3103] = MakeColorRef(1, 2, 3);
     host.style.colors[3105] = MakeColorRef(250, 240, 10);

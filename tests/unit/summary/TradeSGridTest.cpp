@@ -33,9 +33,9 @@ struct TradeSGridTest : ::testing::Test {
   const JInstrumentUnderlying ins = Instrument(7, FreshCode("GRID"), "SGX");
   const InstrumentKey key = InstrumentKey{7, hv::Widen(ins.instrumentCode)};
 
-  void TearDown() override { summary::PageFeed::Instance().Reset(); }
+  void TearDown() override { addon::SummaryPageFeed::Instance().Reset(); }
   void SetUp() override {
-    summary::PageFeed::Instance().TakePending();
+    addon::SummaryPageFeed::Instance().TakePending();
     parent.resize(600, 400);
     grid = new TradeSGrid(&parent);
     grid->resize(503, 300);
@@ -130,27 +130,27 @@ TEST_F(TradeSGridTest, WidthsAreEqualWithTheRestInThePriceColumn) {
 
 TEST_F(TradeSGridTest, PagesRegisterOnlyWhenTheCountGrows) {
   // Page 1 at selection.
-  auto pending = summary::PageFeed::Instance().TakePending();
+  auto pending = addon::SummaryPageFeed::Instance().TakePending();
   ASSERT_EQ(pending.size(), 1u);
-  EXPECT_EQ(pending[0], (summary::PageFeed::Pending{key, 1}));
+  EXPECT_EQ(pending[0], (addon::SummaryPageFeed::Pending{key, 1}));
   EXPECT_EQ(grid->RegisteredPages(), 1);
   grid->RegisterPagesUpTo(1);
   grid->RegisterPagesUpTo(0);
-  EXPECT_TRUE(summary::PageFeed::Instance().TakePending().empty()) << "a page count that does not grow registers nothing";
+  EXPECT_TRUE(addon::SummaryPageFeed::Instance().TakePending().empty()) << "a page count that does not grow registers nothing";
   grid->RegisterPagesUpTo(3);
-  pending = summary::PageFeed::Instance().TakePending();
+  pending = addon::SummaryPageFeed::Instance().TakePending();
   ASSERT_EQ(pending.size(), 2u);
   EXPECT_EQ(pending[0].params, 2);
   EXPECT_EQ(pending[1].params, 3);
   grid->RegisterPagesUpTo(3);
-  EXPECT_TRUE(summary::PageFeed::Instance().TakePending().empty());
+  EXPECT_TRUE(addon::SummaryPageFeed::Instance().TakePending().empty());
   grid->RegisterPagesUpTo(250);
   EXPECT_EQ(grid->RegisteredPages(), 99);
-  EXPECT_EQ(summary::PageFeed::Instance().TakePending().size(), 96u);
+  EXPECT_EQ(addon::SummaryPageFeed::Instance().TakePending().size(), 96u);
   // Without an instrument nothing registers.
   grid->Reset();
   grid->RegisterPagesUpTo(5);
-  EXPECT_TRUE(summary::PageFeed::Instance().TakePending().empty());
+  EXPECT_TRUE(addon::SummaryPageFeed::Instance().TakePending().empty());
   EXPECT_EQ(grid->NewestStamp(), 0u);
 }
 

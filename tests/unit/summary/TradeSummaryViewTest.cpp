@@ -21,7 +21,7 @@ bool Logged(const mvtest::FakeLogFactory& logs, const std::string& text) {
 
 TEST_F(TradeSummaryView, Selection_AsksForPageOneOnTheNextTick) {
   CTradeSummaryAdv* view = Make();
-  summary::PageFeed::Instance().TakePending();
+  addon::SummaryPageFeed::Instance().TakePending();
   host.ClearRequests();
   Select(view, instruments[0]);
   EXPECT_TRUE(FieldRequests().empty()) << "nothing leaves at selection time";
@@ -62,7 +62,7 @@ TEST_F(TradeSummaryView, Selection_RefusalsShowTheirTextsAndClearTableAndChart) 
   host.AnswerValue(hm::ExchangeEnabled, 0);
   Select(view, instruments[3]);
   EXPECT_EQ(view->GetSummaryGrid()->GetMessage(), L"Trade summary is not available for this exchange.");
-  summary::PageFeed::Instance().TakePending();
+  addon::SummaryPageFeed::Instance().TakePending();
   host.ClearRequests();
   host.Advance(400);
   EXPECT_TRUE(FieldRequests().empty());
