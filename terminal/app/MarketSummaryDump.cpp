@@ -3,6 +3,9 @@
 #include <fstream>
 #include <set>
 
+#include "hostview/SuperBaseView.h"
+#include "terminal/app/MainWindow.h"
+#include "terminal/host/HostRuntime.h"
 #include "terminal/sim/Market.h"
 
 namespace term {
@@ -48,6 +51,16 @@ int WriteMarketSummaryDumps(const std::string& dir, sim::Market& market,
     ++files;
   }
   return files;
+}
+
+int WriteMarketSummaryDumps(MainWindow& window, HostRuntime& runtime, const std::string& dir, std::string& error) {
+  std::vector<std::pair<std::int64_t, std::string>> shown;
+  for (ViewDock* d : window.Docks()) {
+    const CSuperBaseView* v = d->View();
+    if (!v || d->ClassName() != QLatin1String("CTradeSummaryAdv")) continue;
+    shown.emplace_back(v->GetStartProductId(), v->GetStartInstrumentCode());
+  }
+  return WriteMarketSummaryDumps(dir, runtime.Market(), shown, error);
 }
 
 }  // namespace term

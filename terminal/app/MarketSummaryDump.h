@@ -18,6 +18,13 @@ class Market;
 
 namespace term {
 
+class HostRuntime;
+class MainWindow;
+
+// The files of the instruments the window's trade-summary views show.
+// Returns the number of files written, or -1 with `error` set.
+int WriteMarketSummaryDumps(MainWindow& window, HostRuntime& runtime, const std::string& dir, std::string& error);
+
 // The table of one instrument (market index); the heading line alone when it
 // has not traded or is unknown.
 std::string MarketSummaryTsv(sim::Market& market, int index);

@@ -160,6 +160,8 @@ Options:
   --rate N                simulated field updates per second
   --snapshot DIR          at the end, write a PNG of the main window and of each view
   --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv
+                          and the trade tape of each shown instrument as
+                          DIR/market-trades-<code>.tsv
   --list-instruments [N]  print the first N simulated instruments (all without N):
                           product id, instrument code, exchange code, name
   -v, --verbose           also print the views' log lines

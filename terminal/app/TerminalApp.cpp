@@ -17,6 +17,7 @@
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
 #include "terminal/app/MarketSummaryDump.h"
+#include "terminal/app/MarketDump.h"
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/SettingsDialog.h"
 #include "terminal/sim/Market.h"
@@ -34,9 +35,9 @@ const QStringList kAddonClasses = {"CPriceViewAdv",   "CMarketDepthAdv",   "CTim
                                    "CTradeSummaryAdv", "CPriceAlertList",  "CNewPriceAlertAdv"};
 constexpr int kPumpMs = 50;
 constexpr double kDefaultHeadlessSeconds = 10;
-// Before dumps and snapshots the views catch up with a market that stands
-// still: long enough for a page count noticed once a second to be asked for
-// and drawn.
+// At the end of a timed run the views catch up with a market that stands
+// still, so that their dumps and the market's describe the same moment: long
+// enough for a page count noticed once a second to be asked for and drawn.
 constexpr int kSettleMs = 1500;
 constexpr int kAutosaveMs = 60 * 1000;
 
@@ -330,7 +331,7 @@ int TerminalApp::RunTimed() {
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }
-  if (!m_options.dumpDir.empty() || !m_options.snapshotDir.empty()) SettleViews();
+  SettleViews();
   int code = 0;
   if (!SaveLayout()) code = 1;
   std::string error;
@@ -338,6 +339,8 @@ int TerminalApp::RunTimed() {
     const int n = DumpGrids(m_options.dumpDir, error);
     if (n < 0) { Progress("error: " + error); code = 1; }
     else Progress("wrote " + std::to_string(n) + (n == 1 ? " grid dump to " : " grid dumps to ") + m_options.dumpDir);
+    if (WriteMarketTradeDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
+    if (WriteMarketSummaryDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
   }
   if (!m_options.snapshotDir.empty()) {
     const int n = Snapshot(m_options.snapshotDir, error);
@@ -377,14 +380,6 @@ int TerminalApp::DumpGrids(const std::string& dir, std::string& error) {
       ++files;
     }
   }
-  // The market's own volume by price for every instrument a trade summary shows.
-  std::vector<std::pair<std::int64_t, std::string>> summaries;
-  for (ViewDock* d : m_window->Docks())
-    if (d->ClassName() == QLatin1String("CTradeSummaryAdv"))
-      summaries.emplace_back(d->View()->GetStartProductId(), d->View()->GetStartInstrumentCode());
-  const int market = WriteMarketSummaryDumps(dir, m_runtime->Market(), summaries, error);
-  if (market < 0) return -1;
-  files += market;
   return files;
 }
 

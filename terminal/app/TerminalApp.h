@@ -52,9 +52,7 @@ class TerminalApp : public QObject, public IHostShell {
   // Restores the saved layout; returns the number of views reopened.
   int RestoreLayout();
 
-  // Writes <dir>/<Class>-<n>.tsv for every view, and the market's own
-  // market-summary-<code>.tsv for the instruments of the trade-summary views;
-  // returns the number of files.
+  // Writes <dir>/<Class>-<n>.tsv for every view; returns the number of files.
   int DumpGrids(const std::string& dir, std::string& error);
   // Runs the views' timers for a moment with the market standing still, so
   // that what they show has caught up with it.

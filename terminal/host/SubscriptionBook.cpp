@@ -6,6 +6,8 @@
 #include "terminal/host/HostRuntime.h"
 #include "terminal/host/Services.h"
 #include "terminal/host/TextUtil.h"
+#include "terminal/host/SummaryPages.h"
+#include "terminal/host/TradePages.h"
 #include "terminal/host/ViewDirectory.h"
 #include "terminal/sim/Market.h"
 
@@ -23,6 +25,7 @@ SubscriptionBook::SubscriptionBook(sim::Market& market, ViewDirectory& views, Lo
 std::uint32_t SubscriptionBook::DependsOn(const std::string& f, std::int32_t kind) {
   using M = sim::Market;
   if (kind == 1) return M::kBookChanged;
+  if (kind == summary::kKind) return summary::ChangesThatMove(f);
   if (kind != 0) return M::kTradeChanged | M::kBookChanged;
   if (f == "BID" || f == "ASK" || f == "BVOL" || f == "SVOL" || f == "BUY" || f == "SELL" || f == "ORDS_BVOL" ||
       f == "ORDS_SVOL")
@@ -231,8 +234,10 @@ void SubscriptionBook::CollectPushes(Answers& out) {
         }
         continue;
       }
-      std::string value = market_.FieldValue(idx, s.field, s.param, s.kind);
       if (s.last.empty()) s.last.resize(1);
+      // Full history pages of the tape never change: not formatted again.
+      if (s.kind == 2 && !tape::MayHaveMoved(s.field, s.param, int(market_.Trades(idx).size()), s.last[0])) continue;
+      std::string value = market_.FieldValue(idx, s.field, s.param, s.kind);
       if (value == s.last[0]) continue;
       s.last[0] = value;
       out.emplace_back(s.view, FieldUpdate{s.productId, s.code, s.field, std::move(value), s.param, s.kind});

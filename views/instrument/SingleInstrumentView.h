@@ -184,7 +184,8 @@ class CSingleInstrumentView : public CAddonView {
   virtual void RestoreColumnMask(const std::wstring& mask) {}
   // The view's own data notifications (410/412, 2600, ...).
   virtual std::uint32_t OnInstrumentViewMessage(UINT message, LPARAM data) { return 0; }
-  // The area below the header (and the tab strip). Default: all of it for the grid.
+  // Places what lies below the header (the grid, and what a view draws above
+  // it) in `area`. Default: the grid takes all of it.
   virtual void LayoutBody(const QRect& area);
 
   // True while the instrument of a 310 (start parameters) is being selected.
