@@ -89,6 +89,8 @@ class CBarChart : public QWidget {
   QChart* Chart() const { return m_chart; }
   QChartView* View() const { return m_view; }
   QAbstractBarSeries* Bars() const { return m_bars; }
+  // The scroll bar along the groups (shown while they do not all fit).
+  QScrollBar* ScrollBar() const { return m_scroll; }
   // The category texts in axis order (bottom to top when horizontal).
   QStringList AxisLabels() const;
   // The shown window as the user reads it, tab-separated: a heading line (an

@@ -1,5 +1,6 @@
 #include "views/instrument/TradeSummaryAdv.h"
 
+#include <QScrollBar>
 #include <algorithm>
 
 #include "addon/Channel.h"
@@ -8,6 +9,7 @@
 #include "hostview/StyleRoles.h"
 #include "hostview/Text.h"
 #include "platform/Platform.h"
+#include "skin/Skin.h"
 #include "views/instrument/SummaryFeed.h"
 #include "views/instrument/TradeSGrid.h"
 
@@ -93,6 +95,14 @@ void CTradeSummaryAdv::ApplyChartStyle() {
     palette.gridLine = m_pStyleManager->Color(kChartGridLine);
   }
   m_chart->SetPalette(palette);
+  if (m_pStyleManager) {
+    // The chart's scroll bar in the colours of the table's.
+    skin::SkinColors sc = skin::ColorsFromStyle(m_pStyleManager);
+    sc.back = palette.back;
+    sc.track = QColor((sc.back.red() * 3 + sc.face.red()) / 4, (sc.back.green() * 3 + sc.face.green()) / 4,
+                      (sc.back.blue() * 3 + sc.face.blue()) / 4);
+    skin::ApplySkin(m_chart->ScrollBar(), sc);
+  }
 }
 
 // ---- Timers ------------------------------------------------------------------------
