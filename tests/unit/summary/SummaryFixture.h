@@ -79,7 +79,8 @@ struct SummaryFixture : ::testing::Test {
   void TearDown() override { addon::SummaryPageFeed::Instance().Reset(); }
 
   void SetUp() override {
-    addon::SummaryPageFeed::Instance().TakePending();
+    CAddonView::ResetProcessState();
+    addon::SummaryPageFeed::Instance().Reset();
     host.AnswerValue(hm::ExchangeEnabled, 1);
     host.style.colors[3103] = MakeColorRef(1, 2, 3);
     host.style.colors[3105] = MakeColorRef(250, 240, 10);
@@ -116,7 +117,6 @@ struct SummaryFixture : ::testing::Test {
     return link.Wide();
   }
   void Select(CTradeSummaryAdv* view, const JInstrumentUnderlying& i) { host.SendLink(view, LinkFor(i)); }
-  static InstrumentKey KeyOf(const JInstrumentUnderlying& i) { return InstrumentKey{i.productId, hv::Widen(i.instrumentCode)}; }
 
   // One field value as the terminal sends it (412 answer by default).
   void Send(CTradeSummaryAdv* view, const JInstrumentUnderlying& i, const std::string& field, const std::string& value,
