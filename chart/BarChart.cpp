@@ -7,8 +7,11 @@
 #include <QChartView>
 #include <QHorizontalBarSeries>
 #include <QCursor>
+#include <QFontMetrics>
+#include <QResizeEvent>
 #include <QScrollBar>
 #include <QToolTip>
+#include <QGraphicsLayout>
 #include <QGridLayout>
 #include <QLocale>
 #include <QValueAxis>
@@ -23,9 +26,13 @@ CBarChart::CBarChart(QWidget* parent) : QWidget(parent) {
   m_chart->legend()->setAlignment(Qt::AlignTop);
   m_chart->setMargins(QMargins(4, 4, 4, 4));
   m_chart->setBackgroundRoundness(0);
+  // Every pixel for the bars: small views show ten groups too.
+  m_chart->layout()->setContentsMargins(0, 0, 0, 0);
   m_axisX = new QBarCategoryAxis();
   m_axisY = new QValueAxis();
   m_axisY->setLabelFormat(QStringLiteral("%.0f"));
+  // A price is read whole or not at all.
+  m_axisX->setTruncateLabels(false);
   // Thousands grouped as in the tables ("100,000").
   m_chart->setLocale(QLocale(QLocale::English, QLocale::UnitedStates));
   m_chart->setLocalizeNumbers(true);
@@ -117,6 +124,31 @@ void CBarChart::SetPalette(const Palette& palette) {
   setPalette(own);
   setAutoFillBackground(true);
   update();
+}
+
+void CBarChart::SetLabelFont(const QFont& font) {
+  m_chart->legend()->setFont(font);
+  m_axisX->setLabelsFont(font);
+  m_axisY->setLabelsFont(font);
+  FitTicks();
+}
+
+void CBarChart::FitTicks() {
+  // Value labels such as "100,000" need about this much room each.
+  const QFontMetrics metrics(m_axisY->labelsFont());
+  const int room = m_orientation == Qt::Horizontal ? m_view->width() - 80 : m_view->height() - 60;
+  const int each = m_orientation == Qt::Horizontal ? metrics.horizontalAdvance(QStringLiteral("000,000")) + 16
+                                                   : metrics.height() * 2;
+  const int ticks = std::clamp(room / std::max(1, each), 2, 6);
+  if (ticks != m_ticks) {
+    m_ticks = ticks;
+    Rebuild();
+  }
+}
+
+void CBarChart::resizeEvent(QResizeEvent* e) {
+  QWidget::resizeEvent(e);
+  FitTicks();
 }
 
 QStringList CBarChart::AxisLabels() const { return m_axisX->categories(); }
@@ -262,6 +294,7 @@ void CBarChart::Rebuild() {
   m_axisX->append(unique.isEmpty() ? QStringList{QString()} : unique);
   double max = top > m_min ? m_min + (top - m_min) * (1.0 + m_headroom / 100.0) : m_min + 1.0;
   m_axisY->setRange(m_min, max);
+  m_axisY->setTickCount(m_ticks);
   m_axisY->applyNiceNumbers();
   if (m_axisY->min() < m_min) m_axisY->setMin(m_min);
 }

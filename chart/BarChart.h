@@ -8,6 +8,7 @@
 // down the left side, the first shown group at the top, bars to the right (a
 // volume profile).
 #include <QColor>
+#include <QFont>
 #include <QString>
 #include <QStringList>
 #include <QWidget>
@@ -77,6 +78,8 @@ class CBarChart : public QWidget {
     QColor gridLine{214, 219, 227};
   };
   void SetPalette(const Palette& palette);
+  // Font of the legend and the axis labels.
+  void SetLabelFont(const QFont& font);
   const Palette& GetPalette() const { return m_palette; }
 
   // Drops the groups (the series stay).
@@ -104,6 +107,7 @@ class CBarChart : public QWidget {
 
  protected:
   void wheelEvent(QWheelEvent* e) override;
+  void resizeEvent(QResizeEvent* e) override;
 
  private:
   struct Series {
@@ -116,6 +120,8 @@ class CBarChart : public QWidget {
   // The visible groups in the order of their categories on the axis.
   std::vector<int> DrawnGroups() const;
   void UserScroll(int first);
+  // As many value ticks as the value axis has room for.
+  void FitTicks();
 
   std::vector<Series> m_series;
   std::vector<Group> m_groups;
@@ -124,6 +130,7 @@ class CBarChart : public QWidget {
   double m_min = 0.0;
   double m_headroom = 20.0;
   Qt::Orientation m_orientation = Qt::Vertical;
+  int m_ticks = 5;  // value-axis ticks wanted
   Palette m_palette;
   QChart* m_chart = nullptr;
   QChartView* m_view = nullptr;

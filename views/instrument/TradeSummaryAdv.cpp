@@ -17,8 +17,9 @@ ADDON_IMPLEMENT_VIEW(CTradeSummaryAdv)
 
 namespace {
 
-// Style colour of the chart's grid lines.
+// Style colour of the chart's grid lines, style font of its labels (the table's).
 constexpr int kChartGridLine = 104;
+constexpr int kChartLabelFont = 16;
 // Below this width the chart goes under the table instead of beside it.
 constexpr int kSideBySideWidth = 640;
 
@@ -96,6 +97,10 @@ void CTradeSummaryAdv::ApplyChartStyle() {
   }
   m_chart->SetPalette(palette);
   if (m_pStyleManager) {
+    // Labels a size below the table's text: ten prices must fit down the side.
+    QFont labels = m_pStyleManager->GetFont(kChartLabelFont);
+    labels.setPointSizeF(std::max(6.0, labels.pointSizeF() - 1));
+    m_chart->SetLabelFont(labels);
     // The chart's scroll bar in the colours of the table's.
     skin::SkinColors sc = skin::ColorsFromStyle(m_pStyleManager);
     sc.back = palette.back;
