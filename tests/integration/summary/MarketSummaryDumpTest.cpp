@@ -45,7 +45,9 @@ TEST(MarketSummaryDump, SidesAddUpToTheTotalLineByLineInPagingOrder) {
     EXPECT_EQ(f[2].toLongLong(), lines[std::size_t(r)].bidVolume);
     EXPECT_GE(f[3].toLongLong(), 0);
     EXPECT_EQ(f[1].toLongLong() + f[2].toLongLong() + f[3].toLongLong(), f[4].toLongLong());
-    if (r) EXPECT_LT(f[0].toDouble(), rows[r - 1].split('\t')[0].toDouble()) << "highest price first";
+    if (r) {
+      EXPECT_LT(f[0].toDouble(), rows[r - 1].split('\t')[0].toDouble()) << "highest price first";
+    }
     blocks += f[3].toLongLong();
   }
   EXPECT_GT(blocks, 0) << "the opening auction trades off the book sides";
