@@ -172,7 +172,9 @@ Options:
   --snapshot DIR          at the end, write a PNG of the main window and of each view
   --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv
                           and the trade tape of each shown instrument as
-                          DIR/market-trades-<code>.tsv
+                          DIR/market-trades-<code>.tsv, and the volume by price
+                          of each trade summary's instrument as
+                          DIR/market-summary-<code>.tsv
   --list-instruments [N]  print the first N simulated instruments (all without N):
                           product id, instrument code, exchange code, name
   -v, --verbose           also print the views' log lines

@@ -18,6 +18,7 @@
 #include "platform/Platform.h"
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
+#include "terminal/app/MarketSummaryDump.h"
 #include "terminal/app/MarketDump.h"
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/SettingsDialog.h"
@@ -38,8 +39,11 @@ namespace {
 const QStringList kAddonClasses = {"CPriceViewAdv",   "CMarketDepthAdv",   "CTimeAndSalesAdv",
                                    "CTradeSummaryAdv", "CPriceAlertList",  "CNewPriceAlertAdv"};
 constexpr int kPumpMs = 50;
-constexpr int kViewRefreshMs = 200;  // the views' refresh period
 constexpr double kDefaultHeadlessSeconds = 10;
+// At the end of a timed run the views catch up with a market that stands
+// still, so that their dumps and the market's describe the same moment: long
+// enough for a page count noticed once a second to be asked for and drawn.
+constexpr int kSettleMs = 1500;
 constexpr int kAutosaveMs = 60 * 1000;
 
 StartParamMap Widen(const std::map<std::string, std::string>& in) {
@@ -450,13 +454,7 @@ int TerminalApp::RunTimed() {
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }
-  // One more refresh of every view on the final market (no market step), so
-  // that the views' dumps and the market's describe the same moment.
-  if (!m_shutDown) {
-    clock.Advance(kViewRefreshMs);
-    platform::ProcessPosted();
-    QCoreApplication::processEvents();
-  }
+  SettleViews();
   int code = 0;
   if (!SaveLayout()) code = 1;
   std::string error;
@@ -465,6 +463,7 @@ int TerminalApp::RunTimed() {
     if (n < 0) { Progress("error: " + error); code = 1; }
     else Progress("wrote " + std::to_string(n) + (n == 1 ? " grid dump to " : " grid dumps to ") + m_options.dumpDir);
     if (WriteMarketTradeDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
+    if (WriteMarketSummaryDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
   }
   if (!m_options.snapshotDir.empty()) {
     const int n = Snapshot(m_options.snapshotDir, error);
@@ -473,6 +472,17 @@ int TerminalApp::RunTimed() {
   }
   Shutdown();
   return code;
+}
+
+void TerminalApp::SettleViews() {
+  auto& clock = platform::UseVirtualClock();
+  const std::uint32_t marketTick = clock.Now();
+  for (int waited = 0; waited < kSettleMs && !m_shutDown && !m_stopRequested; waited += kPumpMs) {
+    clock.Advance(kPumpMs);
+    m_runtime->Pump(marketTick);  // answers and pushes, but no market step
+    platform::ProcessPosted();
+    QCoreApplication::processEvents();
+  }
 }
 
 int TerminalApp::DumpGrids(const std::string& dir, std::string& error) {

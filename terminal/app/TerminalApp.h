@@ -69,6 +69,9 @@ class TerminalApp : public QObject, public IHostShell {
 
   // Writes <dir>/<Class>-<n>.tsv for every view; returns the number of files.
   int DumpGrids(const std::string& dir, std::string& error);
+  // Runs the views' timers for a moment with the market standing still, so
+  // that what they show has caught up with it.
+  void SettleViews();
   // Writes <dir>/terminal.png and <dir>/<Class>-<n>.png; returns the number of files.
   int Snapshot(const std::string& dir, std::string& error);
 

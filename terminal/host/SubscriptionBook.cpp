@@ -6,6 +6,7 @@
 #include "terminal/host/HostRuntime.h"
 #include "terminal/host/Services.h"
 #include "terminal/host/TextUtil.h"
+#include "terminal/host/SummaryPages.h"
 #include "terminal/host/TradePages.h"
 #include "terminal/host/ViewDirectory.h"
 #include "terminal/sim/Market.h"
@@ -24,6 +25,7 @@ SubscriptionBook::SubscriptionBook(sim::Market& market, ViewDirectory& views, Lo
 std::uint32_t SubscriptionBook::DependsOn(const std::string& f, std::int32_t kind) {
   using M = sim::Market;
   if (kind == 1) return M::kBookChanged;
+  if (kind == summary::kKind) return summary::ChangesThatMove(f);
   if (kind != 0) return M::kTradeChanged | M::kBookChanged;
   if (f == "BID" || f == "ASK" || f == "BVOL" || f == "SVOL" || f == "BUY" || f == "SELL" || f == "ORDS_BVOL" ||
       f == "ORDS_SVOL")
