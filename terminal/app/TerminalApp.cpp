@@ -5,6 +5,7 @@
 #include <QFile>
 #include <QInputDialog>
 #include <QPixmap>
+#include <QStatusBar>
 #include <QTextStream>
 #include <cstdio>
 #include <filesystem>
@@ -17,7 +18,11 @@
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
 #include "terminal/app/MainWindow.h"
+#include "terminal/app/MarketFiles.h"
+#include "terminal/app/PlaybackBar.h"
 #include "terminal/app/SettingsDialog.h"
+#include "terminal/host/MarketSource.h"
+#include "terminal/host/ReplaySource.h"
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteHostStore.h"
 #include "terminal/store/Store.h"
@@ -96,6 +101,11 @@ bool TerminalApp::Start(std::string& error) {
         *m_store, [this](const std::string& e) { Progress("error: " + e); });
   }
   m_styleId = ho.styleId;
+  std::vector<std::string> marketWarnings;
+  if (!PrepareMarketFiles(m_options, ho, marketWarnings, error)) return false;
+  for (const std::string& w : marketWarnings) Progress("warning: " + w);
+  m_recordFile = m_options.recordFile;
+  m_replaySeconds = ReplaySeconds(ho);
   m_runtime = std::make_unique<HostRuntime>(ho, this, m_hostStore.get());
   views::SetRuntime(m_runtime.get());
 
@@ -124,6 +134,13 @@ bool TerminalApp::Start(std::string& error) {
   });
   connect(w, &MainWindow::dropRequested, this, &TerminalApp::OnDrop);
   connect(w, &MainWindow::closingWindow, this, [this] { Shutdown(); });
+  if (ReplaySource* replay = m_runtime->Replay()) {
+    m_playback = new PlaybackBar(*replay, w);
+    w->addToolBar(Qt::TopToolBarArea, m_playback);
+    w->statusBar()->addPermanentWidget(m_playback->StatusLabel());
+    connect(m_playback, &PlaybackBar::notice, w, &MainWindow::ShowNotice);
+  }
+  for (const std::string& warning : marketWarnings) w->ShowNotice(QString::fromStdString(warning));
 
   int restored = 0;
   if (m_options.restoreLayout) restored = RestoreLayout();
@@ -141,7 +158,7 @@ bool TerminalApp::Start(std::string& error) {
 
   if (!m_options.seconds && !m_options.headless) {
     // Real time: move the market along with the monotonic clock.
-    connect(&m_pump, &QTimer::timeout, this, [this] { m_runtime->PumpNow(); });
+    connect(&m_pump, &QTimer::timeout, this, &TerminalApp::Pump);
     m_pump.start(kPumpMs);
     // The layout is also saved now and then, so a crash or a kill loses little of it.
     connect(&m_autosave, &QTimer::timeout, this, [this] { SaveLayout(); });
@@ -155,7 +172,7 @@ void TerminalApp::OpenDefaultLayout() {
   // A first start: the price view and, on the first instrument, its depth and trades.
   std::string error;
   OpenView("CPriceViewAdv", -1, {}, {}, {}, error);
-  const auto& instruments = m_runtime->Market().Instruments();
+  const auto& instruments = m_runtime->Source().Instruments();
   if (!instruments.empty()) {
     const auto& first = instruments.front();
     for (const char* cls : {"CMarketDepthAdv", "CTimeAndSalesAdv"}) {
@@ -189,8 +206,8 @@ CSuperBaseView* TerminalApp::OpenView(const std::string& className, std::int64_t
 
 void TerminalApp::DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code) {
   std::string exchange;
-  const int index = m_runtime->Market().Find(productId, code);
-  if (index >= 0) exchange = m_runtime->Market().Instruments()[static_cast<std::size_t>(index)].exchangeCode;
+  const int index = m_runtime->Source().Find(productId, code);
+  if (index >= 0) exchange = m_runtime->Source().Instruments()[static_cast<std::size_t>(index)].exchangeCode;
   const std::string narrow = "{\"type\":\"instrument view\",\"data\":[{\"Field_product_id\":\"" +
                              std::to_string(productId) + "\",\"Field_instrument_code\":\"" + JsonEscape(code) +
                              "\",\"Field_exchange_code\":\"" + JsonEscape(exchange) + "\"}]}";
@@ -313,19 +330,39 @@ int TerminalApp::RestoreLayout() {
 
 // ---- Timed runs ---------------------------------------------------------------
 
+void TerminalApp::Pump() {
+  m_runtime->PumpNow();
+  if (m_playback) m_playback->Refresh();
+}
+
+bool TerminalApp::FinishRecording() {
+  if (m_recordFile.empty()) return true;
+  std::string error;
+  const bool ok = m_runtime->FinishRecording(&error);
+  if (!ok) Progress("error: " + error);
+  else Progress("recorded the market to " + m_recordFile);
+  m_recordFile.clear();
+  return ok;
+}
+
 int TerminalApp::RunTimed() {
-  const double seconds = m_options.seconds.value_or(kDefaultHeadlessSeconds);
+  // A replay runs to the end of its recording unless told otherwise.
+  const double seconds =
+      m_options.seconds.value_or(m_runtime->Replay() ? m_replaySeconds : kDefaultHeadlessSeconds);
   auto& clock = platform::UseVirtualClock();
   const auto steps = static_cast<long long>(seconds * 1000.0 / kPumpMs + 0.5);
-  Progress("running " + QString::number(seconds).toStdString() + " simulated seconds with " +
+  const ReplaySource* replay = m_runtime->Replay();
+  Progress((replay ? "replaying " + replay->Path() + " (" + replay->Session().date + ") for " : std::string("running ")) +
+           QString::number(seconds).toStdString() + " simulated seconds with " +
            std::to_string(m_window->Docks().size()) + " views");
   for (long long i = 0; i < steps && !m_shutDown && !m_stopRequested; ++i) {
     clock.Advance(kPumpMs);
-    m_runtime->Pump(clock.Now());
+    Pump();
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }
   int code = 0;
+  if (!FinishRecording()) code = 1;
   if (!SaveLayout()) code = 1;
   std::string error;
   if (!m_options.dumpDir.empty()) {
@@ -409,6 +446,7 @@ void TerminalApp::Shutdown() {
   m_pump.stop();
   m_autosave.stop();
   if (!m_options.seconds && !m_options.headless) SaveLayout();
+  FinishRecording();
   m_window->CloseAllViews();
 }
 

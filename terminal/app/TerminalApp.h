@@ -18,6 +18,7 @@ namespace term {
 
 class AddonLoader;
 class MainWindow;
+class PlaybackBar;
 class SqliteHostStore;
 class Store;
 class ViewDock;
@@ -74,6 +75,9 @@ class TerminalApp : public QObject, public IHostShell {
   void Progress(const std::string& line) const;
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
+  void Pump();
+  // Ends the recording, if any, and says how it went. False when it failed.
+  bool FinishRecording();
 
   Options m_options;
   AddonLoader& m_addon;
@@ -81,6 +85,9 @@ class TerminalApp : public QObject, public IHostShell {
   std::unique_ptr<SqliteHostStore> m_hostStore;
   std::unique_ptr<HostRuntime> m_runtime;
   std::unique_ptr<MainWindow> m_window;
+  PlaybackBar* m_playback = nullptr;  // owned by the window; replays only
+  std::string m_recordFile;
+  double m_replaySeconds = 0;
   QTimer m_pump;
   QTimer m_autosave;
   bool m_shutDown = false;
