@@ -59,7 +59,6 @@ PlaybackBar::PlaybackBar(ReplaySource& replay, QWidget* parent) : QToolBar("Play
 
   m_status = new QLabel(this);
   m_status->setToolTip(QString::fromStdString(replay.Path()));
-  m_jumpTime->setTime(QTime::fromMSecsSinceStartOfDay(int(m_replay.TimeOfDayMs())));
   Refresh();
 }
 
@@ -81,6 +80,9 @@ void PlaybackBar::Refresh() {
   if (m_replay.Ended()) where += " (end of the recording)";
   else if (m_replay.Paused()) where += " (paused)";
   m_time->setText("  " + where + "  ");
+  // The jump time follows the replay until the user picks one ahead of it.
+  const QTime now = QTime::fromMSecsSinceStartOfDay(int(m_replay.TimeOfDayMs()));
+  if (!m_jumpTime->hasFocus() && m_jumpTime->time() < now) m_jumpTime->setTime(now);
   QString status = "Market: replay of " + QString::fromStdString(m_replay.Session().date);
   if (!m_replay.Problem().empty()) status += " - stopped: " + QString::fromStdString(m_replay.Problem());
   m_status->setText(status);
