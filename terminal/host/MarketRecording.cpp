@@ -1,9 +1,10 @@
 #include "terminal/host/MarketRecording.h"
 
-#include <zlib.h>
+#include <zstd.h>
 
 #include <cerrno>
 #include <charconv>
+#include <cstdio>
 #include <cstring>
 #include <set>
 #include <utility>
@@ -13,8 +14,9 @@ namespace term::rec {
 namespace {
 
 // Fast compression: the recorder runs inside the terminal's pump.
-constexpr const char* kWriteMode = "wb1";
+constexpr int kLevel = 1;
 constexpr std::size_t kWriteChunk = 256 * 1024;
+constexpr unsigned char kZstdMagic[4] = {0x28, 0xB5, 0x2F, 0xFD};
 constexpr std::size_t kReadChunk = 64 * 1024;
 constexpr std::size_t kMaxLine = 16 * 1024 * 1024;
 
@@ -99,15 +101,43 @@ std::int64_t ValueTable::FieldId(std::string_view field) const {
 
 const std::string& ValueTable::Get(int instrument, std::uint32_t field, int param, int kind) const {
   static const std::string none;
+  if (IsLevel(param, kind)) {
+    const std::vector<std::string>* column = FindColumn(instrument, field);
+    return column && std::size_t(param) <= column->size() ? (*column)[std::size_t(param - 1)] : none;
+  }
   auto it = values_.find(Key{instrument, param, field, kind});
   return it == values_.end() ? none : it->second;
 }
 
 std::string& ValueTable::At(int instrument, std::uint32_t field, int param, int kind) {
+  if (IsLevel(param, kind)) {
+    std::vector<std::string>& column = Column(instrument, field);
+    if (column.size() < std::size_t(param)) column.resize(std::size_t(param));
+    return column[std::size_t(param - 1)];
+  }
   return values_[Key{instrument, param, field, kind}];
 }
 
+std::vector<std::string>& ValueTable::Column(int instrument, std::uint32_t field) {
+  return columns_[Key{instrument, 0, field, 0}];
+}
+
+const std::vector<std::string>* ValueTable::FindColumn(int instrument, std::uint32_t field) const {
+  auto it = columns_.find(Key{instrument, 0, field, 0});
+  return it == columns_.end() ? nullptr : &it->second;
+}
+
 // ---- Writer -------------------------------------------------------------------------
+
+struct Writer::Out {
+  std::FILE* file = nullptr;
+  ZSTD_CCtx* cctx = nullptr;
+  std::string buf = std::string(ZSTD_CStreamOutSize(), '\0');
+  ~Out() {
+    if (cctx) ZSTD_freeCCtx(cctx);
+    if (file) std::fclose(file);
+  }
+};
 
 Writer::Writer() = default;
 Writer::~Writer() { Close(); }
@@ -116,14 +146,21 @@ bool Writer::Open(const std::string& path, std::string& error) {
   Close();
   path_ = path;
   error_.clear();
+  auto out = std::make_unique<Out>();
   errno = 0;
-  gzFile f = gzopen(path.c_str(), kWriteMode);
-  if (!f) {
+  out->file = std::fopen(path.c_str(), "wb");
+  if (!out->file) {
     error = "cannot create the recording " + path + (errno ? std::string(": ") + std::strerror(errno) : std::string());
     return false;
   }
-  gzbuffer(f, 128 * 1024);
-  file_ = f;
+  out->cctx = ZSTD_createCCtx();
+  if (!out->cctx) {
+    error = "cannot create the recording " + path + ": no memory for the compressor";
+    return false;
+  }
+  ZSTD_CCtx_setParameter(out->cctx, ZSTD_c_compressionLevel, kLevel);
+  ZSTD_CCtx_setParameter(out->cctx, ZSTD_c_checksumFlag, 1);  // damage is found, not replayed
+  out_ = std::move(out);
   return true;
 }
 
@@ -133,20 +170,33 @@ void Writer::Fail(const std::string& why) {
   buf_.clear();
 }
 
-void Writer::Put() {
-  if (!file_ || !error_.empty() || buf_.empty()) return;
-  const int n = gzwrite(static_cast<gzFile>(file_), buf_.data(), unsigned(buf_.size()));
-  if (n <= 0) {
-    int code = 0;
-    const char* msg = gzerror(static_cast<gzFile>(file_), &code);
-    Fail(code == Z_ERRNO ? std::strerror(errno) : msg ? msg : "unknown error");
-    return;
+// Compresses the buffer with `mode` and writes what comes out. With a flush or
+// an end, loops until the compressor holds nothing back.
+void Writer::Compress(int mode) {
+  if (!out_ || !error_.empty()) return;
+  ZSTD_inBuffer in{buf_.data(), buf_.size(), 0};
+  for (;;) {
+    ZSTD_outBuffer out{out_->buf.data(), out_->buf.size(), 0};
+    const std::size_t left = ZSTD_compressStream2(out_->cctx, &out, &in, ZSTD_EndDirective(mode));
+    if (ZSTD_isError(left)) {
+      Fail(ZSTD_getErrorName(left));
+      return;
+    }
+    if (out.pos > 0 && std::fwrite(out.dst, 1, out.pos, out_->file) != out.pos) {
+      Fail(std::strerror(errno));
+      return;
+    }
+    const bool done = mode == ZSTD_e_continue ? in.pos == in.size : left == 0;
+    if (done) break;
   }
   buf_.clear();
 }
 
-void Writer::Begin(const SessionInfo& s, const std::vector<JProduct>& products,
-                   const std::vector<JExchangeList>& exchanges, const std::vector<JInstrumentUnderlying>& instruments) {
+void Writer::Put() {
+  if (!buf_.empty()) Compress(ZSTD_e_continue);
+}
+
+void Writer::Begin(const SessionInfo& s, const std::vector<JProduct>& products,                   const std::vector<JExchangeList>& exchanges, const std::vector<JInstrumentUnderlying>& instruments) {
   std::string& b = buf_;
   b.append(kMagic);
   b += '\t';
@@ -220,7 +270,7 @@ void Writer::Begin(const SessionInfo& s, const std::vector<JProduct>& products,
 
 void Writer::Value(std::uint64_t timeMs, int instrument, std::string_view field, int param, int kind,
                    std::string_view value) {
-  if (!file_ || !error_.empty()) return;
+  if (!out_ || !error_.empty()) return;
   std::string& b = buf_;
   b += "V\t";
   AppendNumber(b, timeMs);
@@ -239,50 +289,121 @@ void Writer::Value(std::uint64_t timeMs, int instrument, std::string_view field,
   if (b.size() >= kWriteChunk) Put();
 }
 
-bool Writer::Flush() {
-  if (!file_) return false;
-  Put();
-  if (!error_.empty()) return false;
-  if (gzflush(static_cast<gzFile>(file_), Z_SYNC_FLUSH) != Z_OK) {
-    int code = 0;
-    const char* msg = gzerror(static_cast<gzFile>(file_), &code);
-    Fail(code == Z_ERRNO ? std::strerror(errno) : msg ? msg : "unknown error");
-    return false;
+void Writer::Depth(std::uint64_t timeMs, int instrument, std::string_view field, int firstLevel,
+                   const std::string* values, std::size_t count) {
+  if (!out_ || !error_.empty() || count == 0) return;
+  std::string& b = buf_;
+  b += "D\t";
+  AppendNumber(b, timeMs);
+  b += '\t';
+  AppendNumber(b, instrument);
+  b += '\t';
+  AppendEscaped(b, field);
+  b += '\t';
+  AppendNumber(b, firstLevel);
+  for (std::size_t k = 0; k < count; ++k) {
+    b += '\t';
+    AppendEscaped(b, values[k]);
   }
-  return true;
+  b += '\n';
+  ++values_;
+  if (b.size() >= kWriteChunk) Put();
+}
+
+bool Writer::Flush() {
+  if (!out_) return false;
+  Compress(ZSTD_e_flush);
+  if (error_.empty() && std::fflush(out_->file) != 0) Fail(std::strerror(errno));
+  return error_.empty();
 }
 
 bool Writer::Finish(std::uint64_t endMs) {
-  if (!file_) return error_.empty() && finished_;
+  if (!out_) return error_.empty() && finished_;
   buf_ += "E\t";
   AppendNumber(buf_, endMs);
   buf_ += '\n';
-  Put();
   finished_ = true;
   Close();
   return error_.empty();
 }
 
 void Writer::Close() {
-  if (!file_) return;
-  Put();
-  const int rc = gzclose(static_cast<gzFile>(file_));
-  file_ = nullptr;
-  if (rc != Z_OK) Fail(rc == Z_ERRNO ? std::strerror(errno) : "the file could not be closed");
+  if (!out_) return;
+  Compress(ZSTD_e_end);
+  std::FILE* f = out_->file;
+  out_->file = nullptr;
+  if (std::fclose(f) != 0) Fail(std::strerror(errno));
+  out_.reset();
 }
 
 // ---- Reader -------------------------------------------------------------------------
 
 struct Reader::Input {
-  gzFile file = nullptr;
-  std::string buf;
-  std::size_t pos = 0;
+  std::FILE* file = nullptr;
+  ZSTD_DCtx* dctx = nullptr;  // null: plain text
+  std::string raw, buf;
+  std::size_t rawPos = 0, pos = 0;
+  std::size_t frameLeft = 0;  // bytes the current frame still needs; 0 at a frame's end
   bool eof = false;
   std::string cut;    // why the input ended early; empty: it did not
   std::string error;  // the input cannot be read
 
   ~Input() {
-    if (file) gzclose(file);
+    if (dctx) ZSTD_freeDCtx(dctx);
+    if (file) std::fclose(file);
+  }
+
+  bool Open(const std::string& path) {
+    file = std::fopen(path.c_str(), "rb");
+    if (!file) return false;
+    raw.resize(kReadChunk);
+    raw.resize(std::fread(raw.data(), 1, raw.size(), file));
+    if (raw.size() >= 4 && std::memcmp(raw.data(), kZstdMagic, 4) == 0) dctx = ZSTD_createDCtx();
+    return true;
+  }
+
+  // Appends more text to `buf`; sets `eof` when there is none.
+  void More() {
+    if (!dctx) {
+      if (rawPos < raw.size()) {
+        buf.append(raw, rawPos, std::string::npos);
+        rawPos = raw.size();
+        return;
+      }
+      raw.resize(kReadChunk);
+      raw.resize(std::fread(raw.data(), 1, raw.size(), file));
+      rawPos = 0;
+      if (raw.empty()) eof = true;
+      else buf += raw;
+      rawPos = raw.size();
+      return;
+    }
+    for (;;) {
+      if (rawPos == raw.size()) {
+        raw.resize(kReadChunk);
+        raw.resize(std::fread(raw.data(), 1, raw.size(), file));
+        rawPos = 0;
+        if (raw.empty()) {
+          eof = true;
+          if (frameLeft != 0) cut = "the compressed data ends early";
+          return;
+        }
+      }
+      const std::size_t had = buf.size();
+      buf.resize(had + ZSTD_DStreamOutSize());
+      ZSTD_inBuffer in{raw.data(), raw.size(), rawPos};
+      ZSTD_outBuffer out{buf.data() + had, buf.size() - had, 0};
+      const std::size_t r = ZSTD_decompressStream(dctx, &out, &in);
+      rawPos = in.pos;
+      buf.resize(had + out.pos);
+      if (ZSTD_isError(r)) {
+        error = std::string("the compressed data is damaged (") + ZSTD_getErrorName(r) + ")";
+        eof = true;
+        return;
+      }
+      frameLeft = r;
+      if (out.pos > 0) return;
+    }
   }
 
   // One line without its line feed. False when there is none left (or on an
@@ -297,6 +418,7 @@ struct Reader::Input {
         complete = true;
         return true;
       }
+      if (!error.empty()) return false;
       if (buf.size() - pos > kMaxLine) {
         error = "a line longer than 16 MiB";
         return false;
@@ -310,21 +432,7 @@ struct Reader::Input {
       }
       buf.erase(0, pos);
       pos = 0;
-      const std::size_t had = buf.size();
-      buf.resize(had + kReadChunk);
-      const int n = gzread(file, buf.data() + had, unsigned(kReadChunk));
-      buf.resize(had + std::size_t(n > 0 ? n : 0));
-      if (n <= 0) {
-        eof = true;
-        int code = Z_OK;
-        const char* msg = gzerror(file, &code);
-        if (code == Z_BUF_ERROR) {
-          cut = "the compressed data ends early";
-        } else if (code != Z_OK) {
-          error = std::string("the compressed data is damaged (") + (code == Z_ERRNO ? std::strerror(errno) : msg) + ")";
-          return false;
-        }
-      }
+      More();
     }
   }
 };
@@ -381,12 +489,10 @@ bool Reader::Open(const std::string& path, std::string& error) {
   path_ = path;
   in_ = std::make_unique<Input>();
   errno = 0;
-  in_->file = gzopen(path.c_str(), "rb");
-  if (!in_->file) {
+  if (!in_->Open(path)) {
     error = "cannot open the recording " + path + (errno ? std::string(": ") + std::strerror(errno) : std::string());
     return false;
   }
-  gzbuffer(in_->file, 128 * 1024);
   if (!ParseHeader() || !ParseReference()) {
     error = error_;
     return false;
@@ -513,7 +619,7 @@ bool Reader::ParseReference() {
                     std::to_string(n) + " instruments, but the file lists " + std::to_string(ref_.products.size()) +
                     ", " + std::to_string(ref_.exchanges.size()) + " and " + std::to_string(ref_.instruments.size()));
       return true;
-    } else if (type == "V" || type == "E") {
+    } else if (type == "V" || type == "D" || type == "E") {
       return Fail("a " + type + " line before the reference data is complete (no R line yet)");
     } else {
       return Fail("unknown line type " + Quoted(type));
@@ -554,6 +660,10 @@ Reader::Step Reader::Next(ValueEvent& e) {
       endMs_ = t;
       continue;
     }
+    if (type == "D") {
+      if (!ParseDepth(e)) return Step::Error;
+      return Step::Value;
+    }
     if (type != "V") {
       Fail(type == "P" || type == "X" || type == "I" || type == "R"
                ? "a reference line (" + type + ") after the reference data was complete"
@@ -566,20 +676,7 @@ Reader::Step Reader::Next(ValueEvent& e) {
       return Step::Error;
     }
     ValueEvent v;
-    if (!ParseNumber(fields_[1], v.timeMs)) {
-      Fail("the time " + Quoted(fields_[1]) + " is not a number of milliseconds");
-      return Step::Error;
-    }
-    if (v.timeMs < lastTime_) {
-      Fail("the time " + fields_[1] + " is before the previous event's " + std::to_string(lastTime_));
-      return Step::Error;
-    }
-    if (!ParseNumber(fields_[2], v.instrument) || v.instrument < 0 ||
-        std::size_t(v.instrument) >= ref_.instruments.size()) {
-      Fail("the instrument " + Quoted(fields_[2]) + " is not one of the " + std::to_string(ref_.instruments.size()) +
-           " recorded instruments (0 to " + std::to_string(std::int64_t(ref_.instruments.size()) - 1) + ")");
-      return Step::Error;
-    }
+    if (!ParseTime(fields_[1], v.timeMs) || !ParseInstrument(fields_[2], v.instrument)) return Step::Error;
     if (fields_[3].empty()) {
       Fail("the field name is empty");
       return Step::Error;
@@ -598,6 +695,38 @@ Reader::Step Reader::Next(ValueEvent& e) {
     e = std::move(v);
     return Step::Value;
   }
+}
+
+bool Reader::ParseTime(const std::string& text, std::uint64_t& out) {
+  if (!ParseNumber(text, out)) return Fail("the time " + Quoted(text) + " is not a number of milliseconds");
+  if (out < lastTime_)
+    return Fail("the time " + text + " is before the previous event's " + std::to_string(lastTime_));
+  return true;
+}
+
+bool Reader::ParseInstrument(const std::string& text, int& out) {
+  if (ParseNumber(text, out) && out >= 0 && std::size_t(out) < ref_.instruments.size()) return true;
+  return Fail("the instrument " + Quoted(text) + " is not one of the " + std::to_string(ref_.instruments.size()) +
+              " recorded instruments (0 to " + std::to_string(std::int64_t(ref_.instruments.size()) - 1) + ")");
+}
+
+bool Reader::ParseDepth(ValueEvent& e) {
+  if (fields_.size() < 6)
+    return Fail("a depth line needs the time, instrument, field, first level and at least one value");
+  ValueEvent v;
+  v.depth = true;
+  v.kind = 1;
+  if (!ParseTime(fields_[1], v.timeMs) || !ParseInstrument(fields_[2], v.instrument)) return false;
+  if (fields_[3].empty()) return Fail("the field name is empty");
+  const std::size_t count = fields_.size() - 5;
+  if (!ParseNumber(fields_[4], v.param) || v.param < 1 || std::size_t(v.param) - 1 + count > std::size_t(kMaxLevels))
+    return Fail("the depth levels " + Quoted(fields_[4]) + " to " + std::to_string(count) +
+                " values later are not within 1 to " + std::to_string(kMaxLevels));
+  v.field = std::move(fields_[3]);
+  v.levels.assign(std::make_move_iterator(fields_.begin() + 5), std::make_move_iterator(fields_.end()));
+  lastTime_ = v.timeMs;
+  e = std::move(v);
+  return true;
 }
 
 bool Scan(const std::string& path, Summary& out, std::string& error) {

@@ -7,11 +7,13 @@
 //   P ...   X ...   I ...          products, exchanges, instruments
 //   R <products> <exchanges> <instruments>      the reference data is complete
 //   V <ms> <instrument> <field> <param> <kind> <value>     a value changed
+//   D <ms> <instrument> <field> <level> <value> <value>...  depth levels
+//                                 from <level> on changed (kind 1)
 //   E <ms>                                        the recording ended cleanly
 //
 // Fields are tab-separated; "\\", "\t", "\n" and "\r" inside a field are
-// written as two characters. The file is gzip-compressed (a plain text file
-// reads as well). Plain C++ and zlib; no Qt.
+// written as two characters. The file is zstd-compressed (a plain text file
+// reads as well). Plain C++ and libzstd; no Qt.
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -26,6 +28,8 @@ namespace term::rec {
 
 inline constexpr int kVersion = 1;
 inline constexpr std::string_view kMagic = "MVREC";
+// Depth levels a recording holds (the views ask for 99 at most).
+inline constexpr int kMaxLevels = 999;
 
 struct Reference {
   std::vector<JProduct> products;
@@ -33,18 +37,21 @@ struct Reference {
   std::vector<JInstrumentUnderlying> instruments;
 };
 
-// One "V" line: the value of a field of an instrument from `timeMs` on.
+// One "V" or "D" line: values of a field of an instrument from `timeMs` on.
 struct ValueEvent {
   std::uint64_t timeMs = 0;
   int instrument = 0;   // position in the recording's instrument list
   std::string field;
-  int param = 0;
-  int kind = 0;
-  std::string value;
+  int param = 0;        // D: the first level of `levels`
+  int kind = 0;         // D: 1
+  std::string value;    // V
+  std::vector<std::string> levels;  // D: levels param, param + 1, ...
+  bool depth = false;   // a D line
 };
 
 // The current text of every (instrument, field, param, kind) seen, with the
-// field names interned. A value never set reads as "".
+// field names interned; depth levels (kind 1, levels 1..kMaxLevels) are kept
+// as one column per instrument and field. A value never set reads as "".
 class ValueTable {
  public:
   // A field name's number, made on first use.
@@ -54,7 +61,10 @@ class ValueTable {
   const std::string& Get(int instrument, std::uint32_t field, int param, int kind) const;
   // The stored text, made empty on first use.
   std::string& At(int instrument, std::uint32_t field, int param, int kind);
-  std::size_t Size() const { return values_.size(); }
+  // The depth levels of a field (level 1 first), made empty on first use.
+  std::vector<std::string>& Column(int instrument, std::uint32_t field);
+  const std::vector<std::string>* FindColumn(int instrument, std::uint32_t field) const;
+  static bool IsLevel(int param, int kind) { return kind == 1 && param >= 1 && param <= kMaxLevels; }
 
  private:
   struct Key {
@@ -72,6 +82,7 @@ class ValueTable {
   };
   std::unordered_map<std::string, std::uint32_t, NameHash, std::equal_to<>> fields_;
   std::unordered_map<Key, std::string, KeyHash> values_;
+  std::unordered_map<Key, std::vector<std::string>, KeyHash> columns_;  // param and kind 0
 };
 
 // Writes a recording. Lines are buffered and compressed; Flush() puts all of
@@ -90,6 +101,9 @@ class Writer {
   void Begin(const SessionInfo& session, const std::vector<JProduct>& products,
              const std::vector<JExchangeList>& exchanges, const std::vector<JInstrumentUnderlying>& instruments);
   void Value(std::uint64_t timeMs, int instrument, std::string_view field, int param, int kind, std::string_view value);
+  // Levels `firstLevel`.. of a depth field: `values[0]` .. `values[count - 1]`.
+  void Depth(std::uint64_t timeMs, int instrument, std::string_view field, int firstLevel, const std::string* values,
+             std::size_t count);
   bool Flush();
   // The end line, then closes. False when anything failed.
   bool Finish(std::uint64_t endMs);
@@ -97,15 +111,17 @@ class Writer {
   bool Ok() const { return error_.empty(); }
   const std::string& Error() const { return error_; }
   const std::string& Path() const { return path_; }
-  std::uint64_t Values() const { return values_; }
+  std::uint64_t Values() const { return values_; }  // V and D lines
   bool Finished() const { return finished_; }
 
  private:
+  struct Out;
   void Put();  // hands the buffer to the compressor
+  void Compress(int mode);
   void Fail(const std::string& why);
   void Close();
 
-  void* file_ = nullptr;  // gzFile
+  std::unique_ptr<Out> out_;
   std::string path_, error_, buf_;
   std::uint64_t values_ = 0;
   bool finished_ = false;
@@ -148,6 +164,9 @@ class Reader {
   bool Fail(const std::string& why);
   bool ParseHeader();
   bool ParseReference();
+  bool ParseTime(const std::string& text, std::uint64_t& out);
+  bool ParseInstrument(const std::string& text, int& out);
+  bool ParseDepth(ValueEvent& e);
 
   std::unique_ptr<Input> in_;
   std::string path_, error_;

@@ -1,5 +1,7 @@
 #include "terminal/host/RecordingSource.h"
 
+#include <algorithm>
+
 namespace term {
 
 namespace {
@@ -39,7 +41,9 @@ void RecordingSource::Note(int index, std::uint32_t fieldId, std::string_view fi
   std::string& last = last_.At(index, fieldId, param, kind);
   if (last == value) return;
   last = value;
-  if (!finished_) writer_->Value(inner_.ElapsedMs(), index, field, param, kind, value);
+  if (finished_) return;
+  if (rec::ValueTable::IsLevel(param, kind)) writer_->Depth(inner_.ElapsedMs(), index, field, param, &value, 1);
+  else writer_->Value(inner_.ElapsedMs(), index, field, param, kind, value);
 }
 
 std::string RecordingSource::FieldValue(int index, std::string_view field, int param, int kind) {
@@ -49,11 +53,21 @@ std::string RecordingSource::FieldValue(int index, std::string_view field, int p
   return value;
 }
 
+// One line for the levels between the first and the last that changed.
 void RecordingSource::DepthField(int index, std::string_view field, int levels, std::vector<std::string>& out) {
   inner_.DepthField(index, field, levels, out);
   if (index < 0 || std::size_t(index) >= inner_.Instruments().size()) return;
-  const std::uint32_t id = last_.Intern(field);
-  for (std::size_t k = 0; k < out.size(); ++k) Note(index, id, field, int(k + 1), 1, out[k]);
+  const std::size_t n = std::min<std::size_t>(out.size(), std::size_t(rec::kMaxLevels));
+  std::vector<std::string>& column = last_.Column(index, last_.Intern(field));
+  if (column.size() < n) column.resize(n);
+  std::size_t first = n, last = 0;
+  for (std::size_t k = 0; k < n; ++k) {
+    if (column[k] == out[k]) continue;
+    column[k] = out[k];
+    if (first == n) first = k;
+    last = k;
+  }
+  if (first < n && !finished_) writer_->Depth(inner_.ElapsedMs(), index, field, int(first + 1), &out[first], last - first + 1);
 }
 
 }  // namespace term

@@ -103,7 +103,15 @@ bool ReplaySource::Pull() {
 void ReplaySource::PlayTo(std::uint64_t target) {
   while (Pull() && pending_.timeMs <= target) {
     const int i = pending_.instrument;
-    values_.At(i, values_.Intern(pending_.field), pending_.param, pending_.kind) = std::move(pending_.value);
+    const std::uint32_t field = values_.Intern(pending_.field);
+    if (pending_.depth) {
+      std::vector<std::string>& column = values_.Column(i, field);
+      const std::size_t first = std::size_t(pending_.param - 1), end = first + pending_.levels.size();
+      if (column.size() < end) column.resize(end);
+      std::move(pending_.levels.begin(), pending_.levels.end(), column.begin() + std::ptrdiff_t(first));
+    } else {
+      values_.At(i, field, pending_.param, pending_.kind) = std::move(pending_.value);
+    }
     hasPending_ = false;
     if (!dirty_[std::size_t(i)]) dirtyList_.push_back(i);
     dirty_[std::size_t(i)] = kAllChanged;
@@ -132,9 +140,9 @@ std::string ReplaySource::FieldValue(int index, std::string_view field, int para
 void ReplaySource::DepthField(int index, std::string_view field, int levels, std::vector<std::string>& out) {
   out.assign(std::size_t(std::max(levels, 0)), std::string());
   const std::int64_t id = values_.FieldId(field);
-  if (id < 0) return;
-  for (int level = 1; level <= levels; ++level)
-    out[std::size_t(level - 1)] = values_.Get(index, std::uint32_t(id), level, 1);
+  const std::vector<std::string>* column = id < 0 ? nullptr : values_.FindColumn(index, std::uint32_t(id));
+  if (!column) return;
+  std::copy_n(column->begin(), std::min(out.size(), column->size()), out.begin());
 }
 
 }  // namespace term

@@ -144,11 +144,24 @@ TEST(RecordReplay, TheRecordingHoldsOnlyChangesAtTheirMarketTime) {
   ASSERT_TRUE(r.Open(dir.File("s.mvrec"), error)) << error;
   std::map<std::tuple<int, std::string, int, int>, std::string> last;
   term::rec::ValueEvent e;
-  std::size_t count = 0;
+  std::size_t count = 0, depthLines = 0;
   while (r.Next(e) == term::rec::Reader::Step::Value) {
     ++count;
     EXPECT_EQ(e.timeMs % 50, 0u) << "values move with the market's 50 ms steps";
     EXPECT_LE(e.timeMs, 4000u);
+    if (e.depth) {
+      // Levels between the first and the last that changed, in one line.
+      ++depthLines;
+      ASSERT_FALSE(e.levels.empty());
+      for (std::size_t k = 0; k < e.levels.size(); ++k) {
+        std::string& before = last[{e.instrument, e.field, e.param + int(k), 1}];
+        if (k == 0 || k + 1 == e.levels.size()) {
+          EXPECT_NE(before, e.levels[k]) << "the span ends where values changed";
+        }
+        before = e.levels[k];
+      }
+      continue;
+    }
     auto [it, fresh] = last.try_emplace({e.instrument, e.field, e.param, e.kind}, e.value);
     if (!fresh) {
       EXPECT_NE(it->second, e.value) << "an unchanged value is not written again: " << e.field;
@@ -157,6 +170,7 @@ TEST(RecordReplay, TheRecordingHoldsOnlyChangesAtTheirMarketTime) {
       EXPECT_FALSE(e.value.empty()) << "a value that starts empty is not written";
     }
   }
+  EXPECT_GT(depthLines, 10u);
   EXPECT_TRUE(r.Error().empty()) << r.Error();
   EXPECT_GT(count, 100u);
 }

@@ -70,7 +70,7 @@ TEST(RecordingFile, WhatIsWrittenReadsBackExactly) {
     EXPECT_EQ(w.Values(), values.size());
     ASSERT_TRUE(w.Finish(1500)) << w.Error();
   }
-  EXPECT_EQ(ReadFile(path).substr(0, 2), "\x1f\x8b") << "the file is gzip-compressed";
+  EXPECT_EQ(ReadFile(path).substr(0, 4), "\x28\xb5\x2f\xfd") << "the file is zstd-compressed";
 
   Reader r;
   std::string error;
