@@ -103,6 +103,15 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
       OpenRequest r;
       if (!ParseOpen(text, r, error)) return false;
       o.open.push_back(std::move(r));
+    } else if (arg == "--style") {
+      std::string text;
+      if (!value(text)) return false;
+      if (text == "light" || text == "1") o.style = 1;
+      else if (text == "dark" || text == "2") o.style = 2;
+      else {
+        error = "--style: expected light or dark, got \"" + text + "\"";
+        return false;
+      }
     } else if (arg == "--snapshot") {
       if (!value(o.snapshotDir)) return false;
     } else if (arg == "--dump") {
@@ -181,13 +190,17 @@ Options:
   --seed N                seed of the simulated market (same seed, same market)
   --instruments N         number of simulated instruments (1 to 500000)
   --rate N                simulated field updates per second
+  --style light|dark      the style of this session (the Display menu's choice is kept
+                          for the next; this one is not)
   --record FILE           write the market the views receive (reference data and
-                          every value, with its market time) to FILE, gzip text
+                          every value, with its market time) to FILE, compressed
   --replay FILE           play a recording instead of the simulated market (a
                           headless run lasts as long as the recording)
   --speed X               replay speed, 0.1 to 1000 (default 1: as recorded)
   --snapshot DIR          at the end, write a PNG of the main window and of each view
   --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv
+                          and the trade tape of each shown instrument as
+                          DIR/market-trades-<code>.tsv
   --list-instruments [N]  print the first N simulated instruments (all without N):
                           product id, instrument code, exchange code, name;
                           with --replay, the recording's instruments

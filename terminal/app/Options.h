@@ -24,6 +24,7 @@ struct Options {
   std::optional<std::uint64_t> seed;
   std::optional<int> instruments;
   std::optional<int> rate;          // field updates per second
+  std::optional<int> style;         // 1 light, 2 dark: this session only
   std::vector<OpenRequest> open;
   std::string snapshotDir;
   std::string dumpDir;

@@ -53,14 +53,13 @@ struct HostCore {
   RequestTable requests;
 
   bool relaying300 = false;
-  std::uint32_t lastAlertCheck = 0;
-  bool pumped = false;
 
   // 300 to every price view but `except` (never from inside a 300 relay).
   void NotifyWatchlists(int family, CSuperBaseView* except);
   // Saves the alerts and tells every view but `except` with `message`.
   void AlertsChanged(UINT message, CSuperBaseView* except = nullptr);
-  // Evaluates the alerts against the market and tells the user what fired.
+  // Tells the user what fired since the last pump (notice, log, store) and
+  // announces status changes.
   void CheckAlerts();
   void DropView(CSuperBaseView* view);
 };

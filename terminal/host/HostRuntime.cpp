@@ -30,19 +30,18 @@ void HostCore::AlertsChanged(UINT msg, CSuperBaseView* except) {
 
 void HostCore::CheckAlerts() {
   bool changed = false;
-  const auto fired = user->alerts.Evaluate(*market, &changed);
-  for (const auto& f : fired) {
+  for (const AlertFiring& f : user->alerts->Collect(&changed)) {
     ++stats.alertsFired;
-    const int idx = market->Find(f.alert.productId, f.alert.instrumentCode);
-    const std::string name = idx >= 0 ? market->Instruments()[std::size_t(idx)].instrumentName : f.alert.instrumentCode;
-    const std::string field = f.alert.priceField == "ASK" ? "Ask" : f.alert.priceField == "BID" ? "Bid" : "Last done";
-    const std::string text = "Price alert: " + name + " (" + f.alert.instrumentCode + ") " + field + " " +
-                             f.alert.hostTextB + " " + (f.alert.comparator == "<=" ? "<=" : ">=") + " " +
-                             market->FormatPrice(idx, f.alert.triggerValue);
-    log->Info(text);
-    if (f.alert.viaApp) shell->ShowNotice(options.appTitle, hv::Widen(text));
-    if (f.alert.viaEmail) log->Info("alert " + std::to_string(f.alert.alertId) + ": e-mail notice queued");
-    if (f.alert.viaSms) log->Info("alert " + std::to_string(f.alert.alertId) + ": SMS notice queued");
+    log->Info(f.notice);
+    const PriceAlertItem* a = user->alerts->Find(f.alertId);
+    if (a && a->viaApp) shell->ShowNotice(options.appTitle, hv::Widen(f.notice));
+    if (a && a->viaEmail) log->Info("alert " + std::to_string(f.alertId) + ": e-mail notice queued");
+    if (a && a->viaSms) log->Info("alert " + std::to_string(f.alertId) + ": SMS notice queued");
+    try {
+      store->SaveAlertFiring(f);
+    } catch (const std::exception& e) {
+      log->Error(std::string("saving an alert firing failed: ") + e.what());
+    }
   }
   if (changed) AlertsChanged(hm::Alert703);
 }
@@ -211,12 +210,8 @@ void HostRuntime::Pump(std::uint32_t now) {
     d->shell->ShowNotice(d->options.appTitle, hv::Widen("Recording stopped: " + d->recorder->Writer().Error()));
   }
   d->subscriptions->Pump(d->views.Of(nullptr));
-  // Alerts, twice a second.
-  if (!d->pumped || now - d->lastAlertCheck >= 500) {
-    d->lastAlertCheck = now;
-    d->CheckAlerts();
-  }
-  d->pumped = true;
+  // Alerts: crossings were caught while the market moved; notices and saves now.
+  d->CheckAlerts();
 }
 
 void HostRuntime::PumpNow() { Pump(platform::TickCount()); }
@@ -289,7 +284,7 @@ std::string HostRuntime::ImageDir() const { return d->styles->ImageDir(); }
 std::vector<StoredWatchlist> HostRuntime::Watchlists(StoredWatchlist::Kind kind) const {
   return kind == StoredWatchlist::Brand ? d->user->brandLists : d->user->userLists;
 }
-std::vector<PriceAlertItem> HostRuntime::Alerts() const { return d->user->alerts.All(); }
+std::vector<PriceAlertItem> HostRuntime::Alerts() const { return d->user->alerts->All(); }
 HostStats HostRuntime::Stats() const { return d->stats; }
 
 // Every request goes through the table (terminal/host/requests/).

@@ -6,6 +6,7 @@
 #include "terminal/host/HostRuntime.h"
 #include "terminal/host/Services.h"
 #include "terminal/host/TextUtil.h"
+#include "terminal/host/TradePages.h"
 #include "terminal/host/ViewDirectory.h"
 #include "terminal/host/MarketSource.h"
 #include "terminal/sim/Market.h"
@@ -229,8 +230,14 @@ void SubscriptionBook::CollectPushes(Answers& out) {
         }
         continue;
       }
-      std::string value = market_.FieldValue(idx, s.field, s.param, s.kind);
       if (s.last.empty()) s.last.resize(1);
+      // Full history pages of the tape never change: not formatted again. A
+      // page sent with its last trade was complete then (the tape only grows),
+      // which the text alone tells, whatever market source it came from.
+      if (s.kind == 2 && s.param >= 1 && s.param <= 999 &&
+          !tape::MayHaveMoved(s.field, s.param, tape::kPageSize * s.param, s.last[0]))
+        continue;
+      std::string value = market_.FieldValue(idx, s.field, s.param, s.kind);
       if (value == s.last[0]) continue;
       s.last[0] = value;
       out.emplace_back(s.view, FieldUpdate{s.productId, s.code, s.field, std::move(value), s.param, s.kind});

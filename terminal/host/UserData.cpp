@@ -100,6 +100,20 @@ void MemoryHostStore::SaveAlerts(const std::vector<PriceAlertItem>& a) {
   alerts = a;
   alertsSaved = true;
   ++saveCount;
+  // The history goes with its alert.
+  std::erase_if(firings, [&](const AlertFiring& f) {
+    return std::none_of(a.begin(), a.end(), [&](const PriceAlertItem& x) { return x.alertId == f.alertId; });
+  });
+}
+void MemoryHostStore::SaveAlertFiring(const AlertFiring& firing) {
+  firings.push_back(firing);
+  ++saveCount;
+}
+std::vector<AlertFiring> MemoryHostStore::LoadAlertFirings(std::int32_t alertId) {
+  std::vector<AlertFiring> out;
+  for (const AlertFiring& f : firings)
+    if (f.alertId == alertId) out.push_back(f);
+  return out;
 }
 std::map<std::string, std::string> MemoryHostStore::LoadSettings() { return settings; }
 void MemoryHostStore::SaveSetting(const std::string& key, const std::string& value) {
@@ -151,7 +165,7 @@ void UserData::SaveLists(StoredWatchlist::Kind kind) {
 
 void UserData::SaveAlerts() {
   try {
-    store_.SaveAlerts(alerts.All());
+    store_.SaveAlerts(alerts->All());
   } catch (const std::exception& e) {
     log_.Error(std::string("saving alerts failed: ") + e.what());
   }
@@ -170,7 +184,7 @@ UserData::Edit UserData::Unreadable(const char* what, const std::string& why, co
   return Edit::Unreadable;
 }
 
-void UserData::LoadListsAndAlerts(const sim::Market& market) {
+void UserData::LoadListsAndAlerts(sim::Market& market) {
   std::vector<StoredWatchlist> stored;
   bool had = false;
   try {
@@ -211,7 +225,8 @@ void UserData::LoadListsAndAlerts(const sim::Market& market) {
   } catch (const std::exception& e) {
     log_.Error(std::string("loading alerts failed: ") + e.what());
   }
-  alerts.Load(std::move(stored2));
+  alerts = std::make_unique<AlertDesk>(market);
+  alerts->Load(std::move(stored2));
 }
 
 std::vector<JWatchlistRow> UserData::UserRows() const {

@@ -4,12 +4,14 @@
 // saved after every change; a failing save is logged and the runtime keeps its
 // copy (the next change saves the whole set again).
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <vector>
 
 #include "hostview/AlertRecords.h"
 #include "hostview/HostLists.h"
 #include "hostview/Records.h"
+#include "terminal/host/AlertDesk.h"
 #include "terminal/host/HostRuntime.h"
 #include "terminal/host/HostStore.h"
 #include "terminal/host/MarketSource.h"
@@ -28,10 +30,11 @@ class UserData {
   // Settings: the config file (may be empty), then the store's overrides.
   void LoadSettings(const std::string& configFile);
   // Watchlists (starter and brand lists on first start) and alerts.
-  void LoadListsAndAlerts(const sim::Market& market);
+  // The alerts are checked against `market` from then on.
+  void LoadListsAndAlerts(sim::Market& market);
 
   HostSettings settings;
-  sim::AlertBook alerts;
+  std::unique_ptr<AlertDesk> alerts;  // made by LoadListsAndAlerts
   std::vector<StoredWatchlist> userLists, brandLists;
 
   // Changes a setting and stores it.

@@ -530,8 +530,12 @@ void CSingleInstrumentView::Relayout() {
   }
   if (m_second) m_second->hide();
   if (header) top += kHeaderHeight;
-  if (m_grid) m_grid->setGeometry(0, top, w, std::max(0, h - top));
+  LayoutBody(QRect(0, top, w, std::max(0, h - top)));
   update();
+}
+
+void CSingleInstrumentView::LayoutBody(const QRect& area) {
+  if (m_grid) m_grid->setGeometry(area);
 }
 
 void CSingleInstrumentView::resizeEvent(QResizeEvent* e) {

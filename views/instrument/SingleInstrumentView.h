@@ -182,6 +182,9 @@ class CSingleInstrumentView : public CAddonView {
   virtual void RestoreColumnMask(const std::wstring& mask) {}
   // The view's own data notifications (410/412, 2600, ...).
   virtual std::uint32_t OnInstrumentViewMessage(UINT message, LPARAM data) { return 0; }
+  // Places what lies below the header (the grid, and what a view draws above
+  // it) in `area`. Default: the grid takes all of it.
+  virtual void LayoutBody(const QRect& area);
 
   // True while the instrument of a 310 (start parameters) is being selected.
   bool SelectingFromStartParams() const { return m_fromStartParams; }

@@ -7,7 +7,7 @@ namespace term {
 
 void RegisterAlertRequests(RequestTable& table) {
   table.On(hm::Alert701, [](const Request& r) {
-    const std::vector<PriceAlertItem> list = r.host.user->alerts.All();
+    const std::vector<PriceAlertItem> list = r.host.user->alerts->All();
     r.Answer(list);
   });
   table.On(hm::Alert702, [](const Request& r) {
@@ -17,14 +17,14 @@ void RegisterAlertRequests(RequestTable& table) {
       r.host.log->Warn("alert without an instrument refused");
       return;
     }
-    const std::int32_t id = r.host.user->alerts.Create(item);
+    const std::int32_t id = r.host.user->alerts->Create(item);
     r.host.log->Info("alert " + std::to_string(id) + " created for " + item.instrumentCode);
     r.host.AlertsChanged(hm::Alert702);
   });
   table.On(hm::Alert703, [](const Request& r) {
     if (!r.data) return;
     const PriceAlertItem& item = *r.Data<PriceAlertItem>();
-    if (!r.host.user->alerts.Update(item)) {
+    if (!r.host.user->alerts->Update(item)) {
       r.host.log->Warn("change of unknown alert " + std::to_string(item.alertId) + " ignored");
       return;
     }
@@ -32,7 +32,7 @@ void RegisterAlertRequests(RequestTable& table) {
   });
   table.On(hm::Alert704, [](const Request& r) {
     if (!r.data) return;
-    const int n = r.host.user->alerts.Remove(*r.Data<std::vector<std::int32_t>>());
+    const int n = r.host.user->alerts->Remove(*r.Data<std::vector<std::int32_t>>());
     if (n > 0) r.host.AlertsChanged(hm::Alert704);
   });
   table.On(hm::Alert705, [](const Request& r) {
