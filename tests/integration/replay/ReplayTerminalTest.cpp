@@ -70,7 +70,9 @@ struct ViewCase {
   bool onInstrument;
 };
 
-// One line per view that dumps a grid.
+// One line per view that dumps a grid (the price view joins with
+// {"CPriceViewAdv", false} and the trade summary with {"CTradeSummaryAdv", true}
+// once they dump theirs).
 const ViewCase kViews[] = {
     {"CMarketDepthAdv", true},
     {"CTimeAndSalesAdv", true},
