@@ -12,6 +12,7 @@
 #include "addon/Logging.h"
 #include "addon/TextTables.h"
 #include "data/MarketDelayCache.h"
+#include "data/ProcessState.h"
 #include "data/ReferenceStores.h"
 #include "hostview/HostLists.h"
 #include "hostview/Records.h"
@@ -22,12 +23,16 @@ namespace {
 // Classes that have run their first PrepareBasicData in this process.
 std::set<std::string>& PreparedClasses() {
   static std::set<std::string> classes;
+  static const bool hook = mvd::OnResetForTests([] { classes.clear(); });
+  (void)hook;
   return classes;
 }
 
 // The display mode of the first accepted 519 answer in the process.
 int& ProcessDisplayMode() {
   static int mode = 0;
+  static const bool hook = mvd::OnResetForTests([] { mode = 0; });
+  (void)hook;
   return mode;
 }
 

@@ -5,6 +5,8 @@
 #include <utility>
 #include <vector>
 
+#include "data/ProcessState.h"
+
 namespace mvd {
 namespace {
 
@@ -100,7 +102,15 @@ std::int32_t NewestTradeNumber(std::wstring_view text) {
 
 TradeTape& TradeTape::Instance() {
   static TradeTape tape;
+  static const bool hook = mvd::OnResetForTests([] { tape.ResetForTests(); });
+  (void)hook;
   return tape;
+}
+
+void TradeTape::ResetForTests() {
+  std::lock_guard lock(mu_);
+  tapes_.clear();
+  version_.store(0, std::memory_order_release);
 }
 
 bool TradeTape::StoreLocked(Tape& tape, TradeRecord&& trade) {

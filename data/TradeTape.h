@@ -93,6 +93,9 @@ class TradeTape {
   // Bumped by every stored trade; lock-free.
   std::uint64_t Version() const noexcept;
 
+  // Empty, as when first made (tests; see data/ProcessState.h).
+  void ResetForTests();
+
  private:
   struct Block {
     std::array<TradeRecord, mvd::kTradesPerPage> trades{};

@@ -5,6 +5,7 @@
 #include <cmath>
 #include <cstdio>
 
+#include "data/ProcessState.h"
 #include "hostview/Text.h"
 #include "views/instrument/SalesFeed.h"
 
@@ -14,6 +15,8 @@ int PageBatch::AnsweredCount() const { return std::popcount(answered); }
 
 PageBatches& PageBatches::Instance() {
   static PageBatches batches;
+  static const bool hook = mvd::OnResetForTests([] { batches.Clear(); });
+  (void)hook;
   return batches;
 }
 

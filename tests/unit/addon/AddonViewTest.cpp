@@ -11,6 +11,7 @@
 #include "hostview/HostLists.h"
 #include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
+#include "mvtest/ProcessStateReset.h"
 #include "mvtest/ScriptedHost.h"
 
 namespace {

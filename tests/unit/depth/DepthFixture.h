@@ -15,6 +15,7 @@
 #include "data/MarketStores.h"
 #include "hostconfig/UserSettings.h"
 #include "hostview/HostLists.h"
+#include "mvtest/ProcessStateReset.h"
 #include "mvtest/ScriptedHost.h"
 #include "views/instrument/DepthGrid.h"
 #include "views/instrument/MarketDepthAdv.h"

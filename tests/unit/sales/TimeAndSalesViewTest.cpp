@@ -9,6 +9,7 @@
 #include "addon/LinkText.h"
 #include "data/TradeTape.h"
 #include "hostview/HostLists.h"
+#include "mvtest/ProcessStateReset.h"
 #include "mvtest/ScriptedHost.h"
 #include "views/instrument/SalesFeed.h"
 #include "views/instrument/SalesPaging.h"
