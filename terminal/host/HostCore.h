@@ -41,7 +41,7 @@ struct HostCore {
   ReplaySource* replay = nullptr;
   std::unique_ptr<RecordingSource> recorder;
   MarketSource* source = nullptr;
-  bool recordingProblemShown = false;
+  bool recordingProblemShown = false, replayProblemShown = false;
   std::unique_ptr<LanguageTable> language;
   std::unique_ptr<StyleManager> styles;
   MenuManager menus;

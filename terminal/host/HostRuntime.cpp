@@ -204,6 +204,12 @@ void HostRuntime::Pump(std::uint32_t now) {
   d->source->AdvanceTo(now);
   // In a replay the simulator keeps the replay's market time.
   if (d->replay) d->market->AdvanceTo(d->market->Config().startTick + std::uint32_t(d->replay->ElapsedMs()));
+  if (d->replay && !d->replay->Problem().empty() && !d->replayProblemShown) {
+    // The file changed since it was checked: the market stays as it is.
+    d->replayProblemShown = true;
+    d->log->Error("the replay stops: " + d->replay->Problem());
+    d->shell->ShowNotice(d->options.appTitle, hv::Widen("The replay stopped: " + d->replay->Problem()));
+  }
   if (d->recorder && !d->recorder->Writer().Ok() && !d->recordingProblemShown) {
     d->recordingProblemShown = true;
     d->log->Error(d->recorder->Writer().Error() + "; the recording stops here");

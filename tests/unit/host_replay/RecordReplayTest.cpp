@@ -220,3 +220,36 @@ TEST(RecordReplay, AFailingRecordingIsReportedOnceAndTheSessionGoesOn) {
   EXPECT_NE(error.find("/dev/full"), std::string::npos) << error;
   EXPECT_GT(runtime.Source().ElapsedMs(), 0u) << "the market goes on";
 }
+
+TEST(RecordReplay, ARecordingDamagedAfterItsCheckStopsTheReplayWithANotice) {
+  EnsureApp();
+  TempDir dir;
+  const std::string path = dir.File("changing.mvrec");
+  WriteRecording(path, {{0, 0, "BID", 0, 0, "1.5"}, {100, 0, "BID", 0, 0, "1.6"}}, 1000);
+  auto summary = std::make_shared<term::rec::Summary>();
+  std::string error;
+  ASSERT_TRUE(term::rec::Scan(path, *summary, error)) << error;
+  // Someone rewrites the file after the terminal checked it.
+  const term::rec::Reference r = SmallReference();
+  {
+    term::rec::Writer w;
+    ASSERT_TRUE(w.Open(path, error));
+    w.Begin(SmallSession(), r.products, r.exchanges, r.instruments);
+    w.Value(0, 0, "BID", 0, 0, "1.5");
+    w.Value(100, 0, "BID", 0, 9, "1.6");  // a kind no recording has
+    w.Finish(1000);
+  }
+  term::HostOptions o = Options();
+  o.replay = summary;
+  RecordingShell shell;
+  term::MemoryHostStore store;
+  term::HostRuntime runtime(o, &shell, &store);
+  shell.runtime = &runtime;
+  std::uint32_t now = platform::UseVirtualClock().Now();
+  for (int step = 0; step < 10; ++step) runtime.Pump(now += 50);
+  ASSERT_EQ(shell.notices.size(), 1u) << "told once";
+  EXPECT_EQ(shell.notices[0].rfind(L"The replay stopped: " + std::wstring(path.begin(), path.end()), 0), 0u);
+  EXPECT_EQ(runtime.Source().FieldValue(0, "BID", 0, 0), "1.5") << "the market stays as it was";
+  ASSERT_NE(runtime.Replay(), nullptr);
+  EXPECT_NE(runtime.Replay()->Problem().find("the kind \"9\""), std::string::npos) << runtime.Replay()->Problem();
+}
