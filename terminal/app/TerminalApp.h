@@ -18,6 +18,8 @@ struct CRuntimeClass;
 namespace term {
 
 class AddonLoader;
+class MainWindow;
+class PlaybackBar;
 namespace views {
 class Blotter;
 }
@@ -96,6 +98,8 @@ class TerminalApp : public QObject, public IHostShell {
   bool timed() const { return m_options.headless || m_options.seconds.has_value(); }
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
+  // Ends the recording, if any, and says how it went. False when it failed.
+  bool FinishRecording();
   // The add-on's (or the terminal's own) classes with their names for a person.
   std::vector<MainWindow::ViewClass> ViewClasses(bool addon) const;
 
@@ -106,6 +110,9 @@ class TerminalApp : public QObject, public IHostShell {
   std::unique_ptr<HostRuntime> m_runtime;
   std::unique_ptr<views::Blotter> m_blotter;
   std::unique_ptr<MainWindow> m_window;
+  PlaybackBar* m_playback = nullptr;  // owned by the window; replays only
+  std::string m_recordFile;
+  double m_replaySeconds = 0;
   QTimer m_pump;
   QTimer m_autosave;
   bool m_shutDown = false;
