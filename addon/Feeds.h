@@ -9,6 +9,12 @@
 //               and send the quote batches for what TakePending(shown) hands out;
 //               registering a shown instrument again asks for it again.
 //   SalesHeaderFeed, SalesPageFeed  the time-and-sales header and pages (below).
+//   SummaryPageFeed  SummaryHeaderStore; params: a trade-summary page (1..99);
+//               record: the instrument's summary header. The trade-summary
+//               view sends the page request for each pending interest.
+//   SummaryLineFeed  SummaryLineStore, read only: how many lines there are is
+//               known only when they arrive, so nothing is registered; the
+//               trade-summary view makes their records as pages arrive.
 #include <cstdint>
 #include <vector>
 
@@ -57,5 +63,19 @@ struct SalesPageFeedTraits {
   static std::vector<PageKey> RecordKeys(const InstrumentKey& key, std::int32_t page);
 };
 using SalesPageFeed = StoreFeed<SalesPageFeedTraits>;
+
+struct SummaryPageFeedTraits {
+  using Store = SummaryHeaderStore;
+  using Params = int;  // the page
+  static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, int) { return {key}; }
+};
+using SummaryPageFeed = StoreFeed<SummaryPageFeedTraits>;
+
+struct SummaryLineFeedTraits {
+  using Store = SummaryLineStore;
+  using Params = NoParams;
+  static std::vector<LineKey> RecordKeys(const InstrumentKey&, NoParams) { return {}; }
+};
+using SummaryLineFeed = StoreFeed<SummaryLineFeedTraits>;
 
 }  // namespace addon

@@ -31,6 +31,9 @@ struct Options {
   std::optional<int> listInstruments;  // set: print the first N instruments and exit (0: all)
   std::string addonPath;
   std::string dataDir;
+  std::string recordFile;           // --record: write the market the views receive here
+  std::string replayFile;           // --replay: the market is this recording
+  std::optional<double> speed;      // --speed: replay speed (needs --replay)
 };
 
 // Parses argv. On a bad command line returns false with a one-line `error`.

@@ -8,6 +8,7 @@
 #include <QInputDialog>
 #include <QPalette>
 #include <QPixmap>
+#include <QStatusBar>
 #include <QTextStream>
 #include <cstdio>
 #include <filesystem>
@@ -20,12 +21,17 @@
 #include "platform/Platform.h"
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
+#include "terminal/app/MarketSummaryDump.h"
 #include "terminal/app/MarketDump.h"
 #include "terminal/host/MarketQuotes.h"
 #include "terminal/app/MainWindow.h"
+#include "terminal/app/MarketFiles.h"
+#include "terminal/app/PlaybackBar.h"
 #include "terminal/app/SettingsDialog.h"
 #include "terminal/app/TerminalStyle.h"
 #include "terminal/host/Services.h"
+#include "terminal/host/MarketSource.h"
+#include "terminal/host/ReplaySource.h"
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteHostStore.h"
 #include "terminal/store/Store.h"
@@ -41,8 +47,11 @@ namespace {
 const QStringList kAddonClasses = {"CPriceViewAdv",   "CMarketDepthAdv",   "CTimeAndSalesAdv",
                                    "CTradeSummaryAdv", "CPriceAlertList",  "CNewPriceAlertAdv"};
 constexpr int kPumpMs = 50;
-constexpr int kViewRefreshMs = 200;  // the views' refresh period
 constexpr double kDefaultHeadlessSeconds = 10;
+// At the end of a timed run the views catch up with a market that stands
+// still, so that their dumps and the market's describe the same moment: long
+// enough for a page count noticed once a second to be asked for and drawn.
+constexpr int kSettleMs = 1500;
 constexpr int kAutosaveMs = 60 * 1000;
 
 StartParamMap Widen(const std::map<std::string, std::string>& in) {
@@ -123,6 +132,11 @@ bool TerminalApp::Start(std::string& error) {
   }
   if (m_options.style) ho.styleId = *m_options.style;
   m_styleId = ho.styleId;
+  std::vector<std::string> marketWarnings;
+  if (!PrepareMarketFiles(m_options, ho, marketWarnings, error)) return false;
+  for (const std::string& w : marketWarnings) Progress("warning: " + w);
+  m_recordFile = m_options.recordFile;
+  m_replaySeconds = ReplaySeconds(ho);
   m_runtime = std::make_unique<HostRuntime>(ho, this, m_hostStore.get());
   views::SetRuntime(m_runtime.get());
   m_log = m_runtime->LogFactory().CreateLogger();
@@ -137,7 +151,7 @@ bool TerminalApp::Start(std::string& error) {
   std::vector<std::string> unknownInstruments(m_options.open.size());
   for (std::size_t k = 0; k < m_options.open.size(); ++k) {
     const OpenRequest& o = m_options.open[k];
-    if (o.productId < 0 || m_runtime->Market().Find(o.productId, o.instrumentCode) >= 0) continue;
+    if (o.productId < 0 || m_runtime->Source().Find(o.productId, o.instrumentCode) >= 0) continue;
     unknownInstruments[k] = "unknown instrument " + std::to_string(o.productId) + ":" + o.instrumentCode +
                             " in --open " + o.className + ":" + std::to_string(o.productId) + ":" +
                             o.instrumentCode + " (--list-instruments lists the instruments)";
@@ -177,6 +191,13 @@ bool TerminalApp::Start(std::string& error) {
   });
   connect(w, &MainWindow::dropRequested, this, &TerminalApp::OnDrop);
   connect(w, &MainWindow::closingWindow, this, [this] { Shutdown(); });
+  if (ReplaySource* replay = m_runtime->Replay()) {
+    m_playback = new PlaybackBar(*replay, w);
+    w->addToolBar(Qt::TopToolBarArea, m_playback);
+    w->statusBar()->addPermanentWidget(m_playback->StatusLabel());
+    connect(m_playback, &PlaybackBar::notice, w, &MainWindow::ShowNotice);
+  }
+  for (const std::string& warning : marketWarnings) w->ShowNotice(QString::fromStdString(warning));
 
   int restored = 0;
   if (m_options.restoreLayout) restored = RestoreLayout();
@@ -212,15 +233,23 @@ bool TerminalApp::Start(std::string& error) {
 void TerminalApp::Pump(std::uint32_t now) {
   m_runtime->Pump(now);
   if (m_blotter) m_blotter->CheckFills(m_runtime->Market());
+  if (m_playback) m_playback->Refresh();
 }
 
 void TerminalApp::OpenDefaultLayout() {
   // A first start: the price view and, on the busiest stock, its depth and trades.
   std::string error;
   OpenView("CPriceViewAdv", -1, {}, {}, {}, error);
-  const int stock = m_runtime->Market().LiquidStock();
+  // The busiest stock of the simulator, or of the recording when it has not that one.
+  const MarketSource& market = m_runtime->Source();
+  int stock = -1;
+  if (const int liquid = m_runtime->Market().LiquidStock(); liquid >= 0) {
+    const auto& ins = m_runtime->Market().Instruments()[static_cast<std::size_t>(liquid)];
+    stock = market.Find(ins.productId, ins.instrumentCode);
+  }
+  if (stock < 0 && !market.Instruments().empty()) stock = 0;
   if (stock >= 0) {
-    const auto& first = m_runtime->Market().Instruments()[static_cast<std::size_t>(stock)];
+    const auto& first = market.Instruments()[static_cast<std::size_t>(stock)];
     for (const char* cls : {"CMarketDepthAdv", "CTimeAndSalesAdv"}) {
       StartParamMap params{{"User_field_product_id", std::to_wstring(first.productId)},
                            {"User_field_save_space", L"0"}};
@@ -252,8 +281,8 @@ CSuperBaseView* TerminalApp::OpenView(const std::string& className, std::int64_t
 
 void TerminalApp::DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code) {
   std::string exchange;
-  const int index = m_runtime->Market().Find(productId, code);
-  if (index >= 0) exchange = m_runtime->Market().Instruments()[static_cast<std::size_t>(index)].exchangeCode;
+  const int index = m_runtime->Source().Find(productId, code);
+  if (index >= 0) exchange = m_runtime->Source().Instruments()[static_cast<std::size_t>(index)].exchangeCode;
   const std::string narrow = "{\"type\":\"instrument view\",\"data\":[{\"Field_product_id\":\"" +
                              std::to_string(productId) + "\",\"Field_instrument_code\":\"" + JsonEscape(code) +
                              "\",\"Field_exchange_code\":\"" + JsonEscape(exchange) + "\"}]}";
@@ -487,11 +516,25 @@ int TerminalApp::RestoreLayout() {
 
 // ---- Timed runs ---------------------------------------------------------------
 
+bool TerminalApp::FinishRecording() {
+  if (m_recordFile.empty()) return true;
+  std::string error;
+  const bool ok = m_runtime->FinishRecording(&error);
+  if (!ok) Progress("error: " + error);
+  else Progress("recorded the market to " + m_recordFile);
+  m_recordFile.clear();
+  return ok;
+}
+
 int TerminalApp::RunTimed() {
-  const double seconds = m_options.seconds.value_or(kDefaultHeadlessSeconds);
+  // A replay runs to the end of its recording unless told otherwise.
+  const double seconds =
+      m_options.seconds.value_or(m_runtime->Replay() ? m_replaySeconds : kDefaultHeadlessSeconds);
   auto& clock = platform::UseVirtualClock();
   const auto steps = static_cast<long long>(seconds * 1000.0 / kPumpMs + 0.5);
-  Progress("running " + QString::number(seconds).toStdString() + " simulated seconds with " +
+  const ReplaySource* replay = m_runtime->Replay();
+  Progress((replay ? "replaying " + replay->Path() + " (" + replay->Session().date + ") for " : std::string("running ")) +
+           QString::number(seconds).toStdString() + " simulated seconds with " +
            std::to_string(m_window->Docks().size()) + " views");
   for (long long i = 0; i < steps && !m_shutDown && !m_stopRequested; ++i) {
     clock.Advance(kPumpMs);
@@ -499,25 +542,24 @@ int TerminalApp::RunTimed() {
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }
-  // One more refresh of every view on the final market (no market step), so
-  // that the views' dumps and the market's describe the same moment.
-  if (!m_shutDown) {
-    clock.Advance(kViewRefreshMs);
-    platform::ProcessPosted();
-    QCoreApplication::processEvents();
-  }
+  SettleViews();
   int code = 0;
+  if (!FinishRecording()) code = 1;
   if (!SaveLayout()) code = 1;
   std::string error;
   if (!m_options.dumpDir.empty()) {
     const int n = DumpGrids(m_options.dumpDir, error);
     if (n < 0) { Progress("error: " + error); code = 1; }
     else Progress("wrote " + std::to_string(n) + (n == 1 ? " grid dump to " : " grid dumps to ") + m_options.dumpDir);
-    if (WriteMarketTradeDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
-    const std::string quotes = (fs::path(m_options.dumpDir) / "market-quotes.tsv").string();
-    if (!WriteMarketQuotes(quotes, m_runtime->Market(), m_runtime->QuoteInstruments(), error)) {
-      Progress("error: " + error);
-      code = 1;
+    // The market files are the simulator's: in a replay they are not the market played.
+    if (!m_runtime->Replay()) {
+      if (WriteMarketTradeDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
+      if (WriteMarketSummaryDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
+      const std::string quotes = (fs::path(m_options.dumpDir) / "market-quotes.tsv").string();
+      if (!WriteMarketQuotes(quotes, m_runtime->Market(), m_runtime->QuoteInstruments(), error)) {
+        Progress("error: " + error);
+        code = 1;
+      }
     }
   }
   if (!m_options.snapshotDir.empty()) {
@@ -527,6 +569,17 @@ int TerminalApp::RunTimed() {
   }
   Shutdown();
   return code;
+}
+
+void TerminalApp::SettleViews() {
+  auto& clock = platform::UseVirtualClock();
+  const std::uint32_t marketTick = clock.Now();
+  for (int waited = 0; waited < kSettleMs && !m_shutDown && !m_stopRequested; waited += kPumpMs) {
+    clock.Advance(kPumpMs);
+    m_runtime->Pump(marketTick);  // answers and pushes, but no market step
+    platform::ProcessPosted();
+    QCoreApplication::processEvents();
+  }
 }
 
 int TerminalApp::DumpGrids(const std::string& dir, std::string& error) {
@@ -596,6 +649,7 @@ void TerminalApp::Shutdown() {
   m_pump.stop();
   m_autosave.stop();
   if (!timed()) SaveLayout();
+  FinishRecording();
   m_window->CloseAllViews();
 }
 

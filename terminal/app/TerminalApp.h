@@ -18,6 +18,8 @@ struct CRuntimeClass;
 namespace term {
 
 class AddonLoader;
+class MainWindow;
+class PlaybackBar;
 namespace views {
 class Blotter;
 }
@@ -74,6 +76,9 @@ class TerminalApp : public QObject, public IHostShell {
 
   // Writes <dir>/<Class>-<n>.tsv for every view; returns the number of files.
   int DumpGrids(const std::string& dir, std::string& error);
+  // Runs the views' timers for a moment with the market standing still, so
+  // that what they show has caught up with it.
+  void SettleViews();
   // Writes <dir>/terminal.png and <dir>/<Class>-<n>.png; returns the number of files.
   int Snapshot(const std::string& dir, std::string& error);
 
@@ -100,6 +105,8 @@ class TerminalApp : public QObject, public IHostShell {
   bool timed() const { return m_options.headless || m_options.seconds.has_value(); }
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
+  // Ends the recording, if any, and says how it went. False when it failed.
+  bool FinishRecording();
   // The add-on's (or the terminal's own) classes with their names for a person.
   std::vector<MainWindow::ViewClass> ViewClasses(bool addon) const;
 
@@ -110,6 +117,9 @@ class TerminalApp : public QObject, public IHostShell {
   std::unique_ptr<HostRuntime> m_runtime;
   std::unique_ptr<views::Blotter> m_blotter;
   std::unique_ptr<MainWindow> m_window;
+  PlaybackBar* m_playback = nullptr;  // owned by the window; replays only
+  std::string m_recordFile;
+  double m_replaySeconds = 0;
   QTimer m_pump;
   QTimer m_autosave;
   bool m_shutDown = false;

@@ -15,6 +15,7 @@
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/Options.h"
 #include "terminal/app/TerminalApp.h"
+#include "terminal/host/MarketRecording.h"
 #include "terminal/host/Services.h"
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteSettingsStorage.h"
@@ -28,13 +29,21 @@ int Fail(const std::string& message, int code = 1) {
   return code;
 }
 
-// Prints product id, instrument code, exchange code and name, tab-separated.
+// Prints product id, instrument code, exchange code and name, tab-separated:
+// the simulated market's instruments, or a recording's with --replay.
 int ListInstruments(const term::Options& o) {
-  sim::MarketConfig config;
-  if (o.seed) config.seed = *o.seed;
-  if (o.instruments) config.instruments = *o.instruments;
-  sim::Market market(config);
-  const auto& all = market.Instruments();
+  std::vector<JInstrumentUnderlying> all;
+  if (!o.replayFile.empty()) {
+    term::rec::Reader reader;
+    std::string error;
+    if (!reader.Open(o.replayFile, error)) return Fail(error);
+    all = reader.Ref().instruments;
+  } else {
+    sim::MarketConfig config;
+    if (o.seed) config.seed = *o.seed;
+    if (o.instruments) config.instruments = *o.instruments;
+    all = sim::Market(config).Instruments();
+  }
   const std::size_t n = *o.listInstruments == 0 ? all.size()
                                                 : std::min(all.size(), static_cast<std::size_t>(*o.listInstruments));
   std::string out;

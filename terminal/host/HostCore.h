@@ -6,6 +6,9 @@
 #include <string>
 
 #include "terminal/host/HostRuntime.h"
+#include "terminal/host/MarketSource.h"
+#include "terminal/host/RecordingSource.h"
+#include "terminal/host/ReplaySource.h"
 #include "terminal/host/RequestTable.h"
 #include "terminal/host/Services.h"
 #include "terminal/host/SubscriptionBook.h"
@@ -31,7 +34,14 @@ struct HostCore {
   IHostStore* store = nullptr;  // never null
   HostStats stats;
   std::unique_ptr<LogFactory> log;
-  std::unique_ptr<sim::Market> market;
+  std::unique_ptr<sim::Market> market;  // the simulator: also the terminal's own extras
+  // What the views receive: `source` is the recorder when recording, else
+  // `marketSource` (the simulator's, or the replay `replay` points at).
+  std::unique_ptr<MarketSource> marketSource;
+  ReplaySource* replay = nullptr;
+  std::unique_ptr<RecordingSource> recorder;
+  MarketSource* source = nullptr;
+  bool recordingProblemShown = false, replayProblemShown = false;
   std::unique_ptr<LanguageTable> language;
   std::unique_ptr<StyleManager> styles;
   MenuManager menus;

@@ -8,6 +8,7 @@
 #include "hostview/Text.h"
 #include "platform/Platform.h"
 #include "terminal/host/HostCore.h"
+#include "terminal/host/SimSource.h"
 #include "terminal/host/TextUtil.h"
 
 namespace term {
@@ -80,9 +81,30 @@ HostRuntime::HostRuntime(const HostOptions& options, IHostShell* shell, IHostSto
   config.fieldUpdatesPerSecond = options.fieldUpdatesPerSecond;
   config.sessionDate = options.sessionDate;
   config.sessionStartSeconds = options.sessionStartSeconds;
+  if (options.replay) {
+    // The simulator plays the recorded session's day on its seed.
+    const SessionInfo& s = options.replay->session;
+    config.seed = s.seed;
+    config.instruments = s.instruments;
+    config.fieldUpdatesPerSecond = s.fieldUpdatesPerSecond;
+    config.sessionDate = s.date;
+    config.sessionStartSeconds = s.startSeconds;
+  }
   config.startTick = platform::TickCount();
   d->market = std::make_unique<sim::Market>(config);
-  d->subscriptions = std::make_unique<SubscriptionBook>(*d->market, d->views, *d->log, d->stats);
+  if (options.replay) {
+    auto replay = std::make_unique<ReplaySource>(*options.replay, config.startTick, options.replaySpeed);
+    d->replay = replay.get();
+    d->marketSource = std::move(replay);
+  } else {
+    d->marketSource = std::make_unique<SimSource>(*d->market);
+  }
+  d->source = d->marketSource.get();
+  if (options.record) {
+    d->recorder = std::make_unique<RecordingSource>(*d->marketSource, options.record);
+    d->source = d->recorder.get();
+  }
+  d->subscriptions = std::make_unique<SubscriptionBook>(*d->source, d->views, *d->log, d->stats);
   RegisterAllRequests(d->requests);
   d->language = std::make_unique<LanguageTable>();
   std::string imageDir = options.imageDir;
@@ -91,11 +113,17 @@ HostRuntime::HostRuntime(const HostOptions& options, IHostShell* shell, IHostSto
   d->styles->DrawAll(StyleManager::kLight);
   d->styles->DrawAll(StyleManager::kDark);
   d->user->LoadListsAndAlerts(*d->market);
-  d->log->Info("market: " + std::to_string(d->market->Instruments().size()) + " instruments, seed " +
-               std::to_string(options.seed) + ", session " + d->market->DateText() + " " + d->market->TimeText());
+  if (d->replay)
+    d->log->Info("market: replay of " + d->replay->Path() + ", " + std::to_string(d->source->Instruments().size()) +
+                 " instruments, session " + d->source->Session().date + " " + d->source->TimeText());
+  else
+    d->log->Info("market: " + std::to_string(d->market->Instruments().size()) + " instruments, seed " +
+                 std::to_string(options.seed) + ", session " + d->market->DateText() + " " + d->market->TimeText());
+  if (d->recorder) d->log->Info("market: recording to " + d->recorder->Writer().Path());
 }
 
 HostRuntime::~HostRuntime() {
+  FinishRecording();
   d->views.DisconnectAll();
   d->log->Flush();
 }
@@ -174,7 +202,20 @@ std::vector<CSuperBaseView*> HostRuntime::Views() const { return d->views.Of(nul
 std::string HostRuntime::ClassNameOf(const CSuperBaseView* view) const { return d->views.ClassNameOf(view); }
 
 void HostRuntime::Pump(std::uint32_t now) {
-  d->market->AdvanceTo(now);
+  d->source->AdvanceTo(now);
+  // In a replay the simulator keeps the replay's market time.
+  if (d->replay) d->market->AdvanceTo(d->market->Config().startTick + std::uint32_t(d->replay->ElapsedMs()));
+  if (d->replay && !d->replay->Problem().empty() && !d->replayProblemShown) {
+    // The file changed since it was checked: the market stays as it is.
+    d->replayProblemShown = true;
+    d->log->Error("the replay stops: " + d->replay->Problem());
+    d->shell->ShowNotice(d->options.appTitle, hv::Widen("The replay stopped: " + d->replay->Problem()));
+  }
+  if (d->recorder && !d->recorder->Writer().Ok() && !d->recordingProblemShown) {
+    d->recordingProblemShown = true;
+    d->log->Error(d->recorder->Writer().Error() + "; the recording stops here");
+    d->shell->ShowNotice(d->options.appTitle, hv::Widen("Recording stopped: " + d->recorder->Writer().Error()));
+  }
   d->subscriptions->Pump(d->views.Of(nullptr));
   // Alerts: crossings were caught while the market moved; notices and saves now.
   d->CheckAlerts();
@@ -227,11 +268,20 @@ void HostRuntime::SaveSetting(const std::string& key, const std::string& value) 
 }
 
 sim::Market& HostRuntime::Market() { return *d->market; }
+MarketSource& HostRuntime::Source() { return *d->source; }
+ReplaySource* HostRuntime::Replay() { return d->replay; }
+
+bool HostRuntime::FinishRecording(std::string* error) {
+  if (!d->recorder) return true;
+  if (d->recorder->Finish()) return true;
+  if (error) *error = d->recorder->Writer().Error();
+  return false;
+}
 
 std::wstring HostRuntime::MessageText(const std::string& code) const {
   long long number = 0;
   MessageTexts::CodeOf(code, &number);
-  const JProduct* p = d->market->FindProduct(number);
+  const JProduct* p = d->source->FindProduct(number);
   return d->messages.Lookup(code, p ? hv::Widen(p->productName) : std::wstring());
 }
 

@@ -6,8 +6,10 @@
 #include "terminal/host/HostRuntime.h"
 #include "terminal/host/Services.h"
 #include "terminal/host/TextUtil.h"
+#include "terminal/host/SummaryPages.h"
 #include "terminal/host/TradePages.h"
 #include "terminal/host/ViewDirectory.h"
+#include "terminal/host/MarketSource.h"
 #include "terminal/sim/Market.h"
 
 namespace term {
@@ -16,14 +18,15 @@ namespace {
 int DepthLevels(std::int32_t param) { return std::clamp(param, 1, int(sim::Market::kDepthLevels)); }
 }  // namespace
 
-SubscriptionBook::SubscriptionBook(sim::Market& market, ViewDirectory& views, LogFactory& log, HostStats& stats)
+SubscriptionBook::SubscriptionBook(MarketSource& market, ViewDirectory& views, LogFactory& log, HostStats& stats)
     : market_(market), views_(views), log_(log), stats_(stats) {}
 
 // Which market changes can move a field, so that a quote move does not
 // re-format the day figures of every subscription.
 std::uint32_t SubscriptionBook::DependsOn(const std::string& f, std::int32_t kind) {
-  using M = sim::Market;
+  using M = MarketSource;
   if (kind == 1) return M::kBookChanged;
+  if (kind == summary::kKind) return summary::ChangesThatMove(f);
   if (kind != 0) return M::kTradeChanged | M::kBookChanged;
   if (f == "BID" || f == "ASK" || f == "BVOL" || f == "SVOL" || f == "BUY" || f == "SELL" || f == "ORDS_BVOL" ||
       f == "ORDS_SVOL")
@@ -118,11 +121,10 @@ void SubscriptionBook::Subscribe(CSuperBaseView* v, const FieldRequest& r, int i
   if (s.kind == 1) {
     // Depth: one answer per level up to the requested count.
     const int levels = DepthLevels(s.param);
-    const std::vector<sim::DepthLevel> book = market_.Book(idx, levels);
+    market_.DepthField(idx, r.fieldName, levels, column_);
     s.last.assign(std::size_t(levels), std::string());
     for (int level = 1; level <= levels; ++level) {
-      FieldUpdate u{r.productId, r.instrumentCode, r.fieldName,
-                    market_.DepthFieldValue(idx, book[std::size_t(level - 1)], r.fieldName), level, 1};
+      FieldUpdate u{r.productId, r.instrumentCode, r.fieldName, column_[std::size_t(level - 1)], level, 1};
       s.last[std::size_t(level - 1)] = u.value;
       answers.emplace_back(v, std::move(u));
     }
@@ -214,17 +216,15 @@ void SubscriptionBook::CollectPushes(Answers& out) {
   for (const auto& [idx, bits] : changed) {
     auto it = byInstrument_.find(idx);
     if (it == byInstrument_.end()) continue;
-    std::vector<sim::DepthLevel> book;  // computed once per instrument and tick
-    int bookLevels = 0;
     for (std::size_t k : it->second) {
       Sub& s = subs_[k];
       if (!s.alive || !(s.dependsOn & bits)) continue;
       if (s.kind == 1) {
         const int levels = DepthLevels(s.param);
-        if (levels > bookLevels) { book = market_.Book(idx, levels); bookLevels = levels; }
+        market_.DepthField(idx, s.field, levels, column_);
         s.last.resize(std::size_t(levels));
         for (int level = 1; level <= levels; ++level) {
-          std::string value = market_.DepthFieldValue(idx, book[std::size_t(level - 1)], s.field);
+          std::string& value = column_[std::size_t(level - 1)];
           std::string& last = s.last[std::size_t(level - 1)];
           if (value == last) continue;
           last = value;
@@ -233,8 +233,12 @@ void SubscriptionBook::CollectPushes(Answers& out) {
         continue;
       }
       if (s.last.empty()) s.last.resize(1);
-      // Full history pages of the tape never change: not formatted again.
-      if (s.kind == 2 && !tape::MayHaveMoved(s.field, s.param, int(market_.Trades(idx).size()), s.last[0])) continue;
+      // Full history pages of the tape never change: not formatted again. A
+      // page sent with its last trade was complete then (the tape only grows),
+      // which the text alone tells, whatever market source it came from.
+      if (s.kind == 2 && s.param >= 1 && s.param <= 999 &&
+          !tape::MayHaveMoved(s.field, s.param, tape::kPageSize * s.param, s.last[0]))
+        continue;
       std::string value = market_.FieldValue(idx, s.field, s.param, s.kind);
       if (value == s.last[0]) continue;
       s.last[0] = value;

@@ -15,19 +15,16 @@
 #include "hostview/Records.h"
 #include "hostview/SuperBaseView.h"
 
-namespace sim {
-class Market;
-}
-
 namespace term {
 
+class MarketSource;
 class LogFactory;
 class ViewDirectory;
 struct HostStats;
 
 class SubscriptionBook {
  public:
-  SubscriptionBook(sim::Market& market, ViewDirectory& views, LogFactory& log, HostStats& stats);
+  SubscriptionBook(MarketSource& market, ViewDirectory& views, LogFactory& log, HostStats& stats);
   SubscriptionBook(const SubscriptionBook&) = delete;
   SubscriptionBook& operator=(const SubscriptionBook&) = delete;
 
@@ -76,7 +73,8 @@ class SubscriptionBook {
   void Deliver(Answers& list, UINT message);
   void Counted();
 
-  sim::Market& market_;
+  MarketSource& market_;
+  std::vector<std::string> column_;  // depth texts of one field
   ViewDirectory& views_;
   LogFactory& log_;
   HostStats& stats_;

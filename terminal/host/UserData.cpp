@@ -245,7 +245,7 @@ std::vector<JWatchlistRow> UserData::UserRows() const {
   return rows;
 }
 
-std::vector<JKeldoWatchlistRow> UserData::BrandRows(const sim::Market& market) const {
+std::vector<JKeldoWatchlistRow> UserData::BrandRows(const MarketSource& market) const {
   std::vector<JKeldoWatchlistRow> rows;
   for (const StoredWatchlist& w : brandLists) {
     if (w.items.empty()) {
@@ -302,7 +302,7 @@ UserData::Edit UserData::SaveNames(const WatchlistFeedback& f) {
   return Edit::Saved;
 }
 
-UserData::Edit UserData::SaveUserItems(const WatchlistFeedback& f, const sim::Market& market) {
+UserData::Edit UserData::SaveUserItems(const WatchlistFeedback& f, const MarketSource& market) {
   std::vector<ItemEntry> items;
   std::string error;
   if (!ParseUserItems(f.text, items, error)) return Unreadable("items", error, f);
@@ -351,7 +351,7 @@ UserData::Edit UserData::RenameBrand(const WatchlistFeedback& f) {
   return Edit::Saved;
 }
 
-UserData::Edit UserData::SaveBrandItems(const WatchlistFeedback& f, const sim::Market& market) {
+UserData::Edit UserData::SaveBrandItems(const WatchlistFeedback& f, const MarketSource& market) {
   std::vector<ItemEntry> items;
   std::string error;
   if (!ParseBrandItems(f.text, items, error)) return Unreadable("brand items", error, f);

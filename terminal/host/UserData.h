@@ -14,6 +14,7 @@
 #include "terminal/host/AlertDesk.h"
 #include "terminal/host/HostRuntime.h"
 #include "terminal/host/HostStore.h"
+#include "terminal/host/MarketSource.h"
 #include "terminal/sim/Market.h"
 
 namespace term {
@@ -47,7 +48,7 @@ class UserData {
 
   // 2813 and 522 rows.
   std::vector<JWatchlistRow> UserRows() const;
-  std::vector<JKeldoWatchlistRow> BrandRows(const sim::Market& market) const;
+  std::vector<JKeldoWatchlistRow> BrandRows(const MarketSource& market) const;
 
   // The price view's watchlist texts. Saved: the lists changed and are
   // stored. Unreadable: the text could not be read (the user should be told).
@@ -55,9 +56,9 @@ class UserData {
   // unless Saved.
   enum class Edit { Saved, Unreadable, Refused };
   Edit SaveNames(const WatchlistFeedback& f);
-  Edit SaveUserItems(const WatchlistFeedback& f, const sim::Market& market);
+  Edit SaveUserItems(const WatchlistFeedback& f, const MarketSource& market);
   Edit RenameBrand(const WatchlistFeedback& f);
-  Edit SaveBrandItems(const WatchlistFeedback& f, const sim::Market& market);
+  Edit SaveBrandItems(const WatchlistFeedback& f, const MarketSource& market);
 
  private:
   Edit Unreadable(const char* what, const std::string& why, const WatchlistFeedback& f);

@@ -38,7 +38,9 @@
 //   EmptyStateText()          the grid's text while an instrument has no rows;
 //   StartTimers(activation)   timers on host code 2 (true) and 1 (false);
 //   column-mask hooks         only the depth view keeps a column mask in its
-//                             start parameters.
+//                             start parameters;
+//   LayoutBody(area)          the area below the header: all of it for the grid
+//                             by default (the trade summary adds its chart).
 // The class-specific data (title entry 7, 8, 10; refusal key "17001",
 // "17002", "17003"; the drop sources) come from addon::ViewClassInfo.
 //

@@ -1,5 +1,7 @@
 // Requests for the market's reference data: instrument, exchange and product
-// lists, remarks, price bands, sectors, look-ups, market information.
+// lists and look-ups (from the market source, so a replay answers with its
+// recording's), remarks, price bands, sectors, market information (the
+// simulator's).
 #include <algorithm>
 
 #include "hostview/MessageIds.h"
@@ -9,15 +11,15 @@ namespace term {
 
 void RegisterReferenceRequests(RequestTable& table) {
   table.On(hm::InstrumentList, [](const Request& r) {
-    const auto& list = r.host.market->Instruments();
+    const auto& list = r.host.source->Instruments();
     r.Answer(JInstrumentListMsg{std::intptr_t(list.size()), 0, &list});
   });
   table.On(hm::ExchangeList, [](const Request& r) {
-    const auto& list = r.host.market->Exchanges();
+    const auto& list = r.host.source->Exchanges();
     r.Answer(JExchangeListMsg{std::intptr_t(list.size()), 0, &list});
   });
   table.On(hm::ProductList, [](const Request& r) {
-    const auto& list = r.host.market->Products();
+    const auto& list = r.host.source->Products();
     r.Answer(JProductListMsg{std::intptr_t(list.size()), &list});
   });
   table.On(hm::RemarkMessages, [](const Request& r) {
@@ -31,7 +33,7 @@ void RegisterReferenceRequests(RequestTable& table) {
     r.Answer(r.host.market->Sectors());
   });
   table.On({hm::FindByChartCode, hm::FindByCode}, [](const Request& r) {
-    sim::Market& market = *r.host.market;
+    const MarketSource& market = *r.host.source;
     const JInstrumentUnderlying* found = nullptr;
     if (r.data) {
       const auto* q = r.Data<JInstrumentLink>();
@@ -61,7 +63,7 @@ void RegisterReferenceRequests(RequestTable& table) {
     if (r.data) {
       const std::string code = r.Data<JExchangeList>()->exchangeCode;
       const std::string off = "," + r.host.user->settings.Get("EXOFF") + ",";
-      enabled = r.host.market->FindExchange(code) && off.find("," + code + ",") == std::string::npos ? 1 : 0;
+      enabled = r.host.source->FindExchange(code) && off.find("," + code + ",") == std::string::npos ? 1 : 0;
     }
     r.AnswerWord(enabled);
   });

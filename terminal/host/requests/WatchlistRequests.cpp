@@ -24,7 +24,7 @@ void RegisterWatchlistRequests(RequestTable& table) {
     r.Answer(groups);
   });
   table.On(hm::WatchlistRows522, [](const Request& r) {
-    const std::vector<JKeldoWatchlistRow> rows = r.host.user->BrandRows(*r.host.market);
+    const std::vector<JKeldoWatchlistRow> rows = r.host.user->BrandRows(*r.host.source);
     r.Answer(rows);
   });
   table.On(hm::WatchlistList, [](const Request& r) {
@@ -43,13 +43,13 @@ void RegisterWatchlistRequests(RequestTable& table) {
     Edited(r, result, 0);
   });
   table.On(hm::SaveUserWatchlist, [](const Request& r) {
-    if (r.data) Edited(r, r.host.user->SaveUserItems(*r.Data<WatchlistFeedback>(), *r.host.market), 0);
+    if (r.data) Edited(r, r.host.user->SaveUserItems(*r.Data<WatchlistFeedback>(), *r.host.source), 0);
   });
   table.On(hm::RenameWatchlist, [](const Request& r) {
     if (r.data) Edited(r, r.host.user->RenameBrand(*r.Data<WatchlistFeedback>()), 2);
   });
   table.On(hm::SaveKeldoWatchlist, [](const Request& r) {
-    if (r.data) Edited(r, r.host.user->SaveBrandItems(*r.Data<WatchlistFeedback>(), *r.host.market), 2);
+    if (r.data) Edited(r, r.host.user->SaveBrandItems(*r.Data<WatchlistFeedback>(), *r.host.source), 2);
   });
   // Price view requests the terminal takes without an answer.
   table.Acknowledge({hm::PriceViewRequest413, hm::PriceViewRequest553, hm::Watchlist606, hm::Watchlist622});
