@@ -136,8 +136,11 @@ bool TerminalApp::Start(std::string& error) {
       params["User_field_product_id"] = std::to_wstring(o.productId);
       params["User_field_save_space"] = L"0";
     }
+    for (const auto& [key, value] : o.params) params[key] = hv::Widen(value);
     CSuperBaseView* v = OpenView(o.className, o.productId, o.instrumentCode, params, {}, error);
     if (!v) return false;
+    // Start parameters reach the view as a restored layout's do.
+    if (!o.params.empty()) m_runtime->DeliverStartLink(v);
     if (o.productId >= 0) DeliverLink(v, o.productId, o.instrumentCode);
   }
   if (restored == 0 && m_options.open.empty()) OpenDefaultLayout();
