@@ -418,13 +418,15 @@ void BoardGrid::paintEvent(QPaintEvent* e) {
 
 void BoardGrid::ShowTip(int col, int row, int area, int textId, const wchar_t* fallback) {
   if (area == 0) {
+    m_tip.clear();
     HideHint();
     return;
   }
   const QRect cell = CellRect(col, row);
   if (cell.isEmpty()) return;
   const QRect button = PBoardTypeEx::AreaBox(cell, PBoardTypeEx::Area(area)).ToRect();
-  ShowHint(LanguageText(textId, fallback), QPoint(button.left(), button.bottom() + 4));
+  m_tip = LanguageText(textId, fallback);
+  ShowHint(m_tip, QPoint(button.left(), button.bottom() + 4));
 }
 
 std::wstring BoardGrid::LinkTextFor(const Tile& tile) const {
@@ -446,6 +448,7 @@ void BoardGrid::OpenAnalytics(int index) {
 
 void BoardGrid::RemoveTile(int index) {
   if (!Removable()) return;
+  m_tip.clear();
   HideHint();
   if (IsEditing()) EndEdit(true);
   const InstrumentKey key = m_tiles[std::size_t(index)].key;

@@ -112,6 +112,8 @@ class BoardGrid : public CGridCtrl, public IQuoteGrid {
   std::wstring TradeRequestFor(int index, int mode) const;
   PBoardTypeEx& TileType() { return m_tileType; }
   const std::wstring& EmptyText() const { return m_emptyText; }
+  // The tooltip on show (85/86), empty when none.
+  const QString& ShownTip() const { return m_tip; }
 
   // What the tiles show, one line per tile in index order, after the quote
   // values were read again.
@@ -169,6 +171,7 @@ class BoardGrid : public CGridCtrl, public IQuoteGrid {
   std::uint64_t m_seenStoreVersion = ~0ull;
   std::uint64_t m_updates = 0;
   std::wstring m_emptyText;
+  QString m_tip;
   QColor m_back{255, 255, 255};
   QColor m_text{0, 0, 0};
   IStyleManager* m_style = nullptr;

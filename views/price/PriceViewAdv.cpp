@@ -705,7 +705,12 @@ void CPriceViewAdv::RestorePendingFilter() {
   // A sector other than "ALL" waits for the terminal's sectors.
   if (!m_filter->HasSectors() && choice->sector != CAdvanceFilter::kAllSectorsValue) return;
   m_pendingFilter.clear();
-  m_filter->Restore(*choice);
+  if (m_filter->Restore(*choice)) return;
+  // A choice the lists no longer offer: an empty filter to choose again.
+  for (IQuoteGrid* g : m_grids)
+    if (g) g->LoadItems(kAdvanceFilter, std::wstring(), {});
+  UpdateEmptyText();
+  StoreStartParams();
 }
 
 // ---- Tabs ----------------------------------------------------------------------------------------------
