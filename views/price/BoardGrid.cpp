@@ -342,16 +342,17 @@ std::wstring BoardGrid::TradeRequestFor(int index, int mode) const {
   return link.Wide();
 }
 
-void BoardGrid::PrepareTrade(int index, int mode) {
-  if (index < 0 || index >= int(m_tiles.size())) return;
+std::optional<std::int64_t> BoardGrid::CheckQuantity(int index, int mode) {
+  if (index < 0 || index >= int(m_tiles.size())) return std::nullopt;
   if (IsEditing()) EndEdit(false);
   Tile& tile = m_tiles[std::size_t(index)];
   const JInstrumentUnderlying* found = Record(tile);
-  if (!found) return;
+  if (!found) return std::nullopt;
   const JInstrumentUnderlying record = *found;  // the terminal may replace its list while we ask
   CAddonView* view = AddonOwner();
   qtycheck::Verdict verdict;
-  if (const auto quantity = qtycheck::ParseQuantity(tile.quantity)) {
+  const auto quantity = qtycheck::ParseQuantity(tile.quantity);
+  if (quantity) {
     qtycheck::TextLookup lookup;
     if (view)
       lookup = [view](const std::string& code, std::int64_t productId) { return view->LookupMessageText(code, productId); };
@@ -363,13 +364,18 @@ void BoardGrid::PrepareTrade(int index, int mode) {
   int col = 0, row = 0;
   TileCell(index, &col, &row);
   RedrawCell(col, row);
-  if (!verdict.valid) {
-    if (!verdict.text.empty() && view) view->ShowMessage(verdict.text);
-    return;
-  }
+  if (verdict.valid) return quantity;
+  if (!verdict.text.empty() && view) view->ShowMessage(verdict.text);
+  return std::nullopt;
+}
+
+void BoardGrid::PrepareTrade(int index, int mode) {
+  if (!CheckQuantity(index, mode)) return;
+  const JInstrumentUnderlying* record = Record(m_tiles[std::size_t(index)]);
+  const bool tradeable = record && Tradeable(*record);
   const std::wstring request = TradeRequestFor(index, mode);
   platform::SendMessage(Owner(), addon::Msg().wlOpenTrade, ToLParam(&request),
-                        Tradeable(record) ? 0 : addon::kRefusedTradeOrigin);
+                        tradeable ? 0 : addon::kRefusedTradeOrigin);
 }
 
 // ---- Cells -------------------------------------------------------------------------------

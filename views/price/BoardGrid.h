@@ -31,6 +31,7 @@
 #include <QStringList>
 #include <cstdint>
 #include <map>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -110,6 +111,9 @@ class BoardGrid : public CGridCtrl, public IQuoteGrid {
   void PrepareTrade(int index, int mode);
   // The JSON text of that ticket (no check).
   std::wstring TradeRequestFor(int index, int mode) const;
+  // The check of a tile's quantity for `mode`: marks the tile and, when it
+  // fails, shows its message. The checked quantity on success.
+  std::optional<std::int64_t> CheckQuantity(int index, int mode);
   PBoardTypeEx& TileType() { return m_tileType; }
   const std::wstring& EmptyText() const { return m_emptyText; }
   // The tooltip on show (85/86), empty when none.

@@ -1263,6 +1263,13 @@ std::optional<std::wstring> CPriceViewAdv::ShortcutTicket(addon::TradeSide side)
   if (selected.empty()) return std::nullopt;
   const InstrumentKey& k = selected.front();
   addon::LinkTextBuilder text = addon::ShortcutTicketText(hv::Narrow(k.InstrumentCode), k.ProductID, side);
+  // On the board the tile's quantity goes with the ticket, once it passes its check.
+  if (grid == m_boardGrid) {
+    const auto quantity =
+        m_boardGrid->CheckQuantity(m_boardGrid->SelectedTile(), side == addon::TradeSide::Buy ? 1 : 2);
+    if (!quantity) return std::nullopt;
+    text.Add(addon::linkkey::kQty, std::to_string(*quantity));
+  }
   // The row's price goes with the ticket only when it is above 0.
   QuoteRecord quote;
   if (QuoteStore::Instance().Peek(k, quote)) {

@@ -2,6 +2,7 @@
 // the tile layout, what the tiles report to the grid, the switch between
 // board and list, the re-check after a settings change and the market delay
 // of a tile.
+#include <QKeyEvent>
 #include <QLineEdit>
 #include <QValidator>
 
@@ -334,6 +335,34 @@ TEST_F(Board, TradingParts_CheckTheQuantityThenOpenATicketWithSidePriceAndQuanti
   Click(board, 1, PBoardTypeEx::kAskBox);
   EXPECT_EQ(Tickets().size(), 3u);
   EXPECT_EQ(Boxes(), (std::vector<QString>{"Not from here"}));
+}
+
+TEST_F(Board, Shortcuts_TheSelectedTileWithItsCheckedQuantity) {
+  instruments[2].lotSize = 100;  // U11
+  CPriceViewAdv* view = MakeBoard();
+  BoardGrid* board = Grid(view);
+  Push(view, instruments[2], "ASK", "3.21");
+  auto press = [&](int key, Qt::KeyboardModifiers modifiers = Qt::NoModifier) {
+    QKeyEvent e(QEvent::KeyPress, key, modifiers);
+    QApplication::sendEvent(board->viewport(), &e);
+  };
+  host.ClearRequests();
+  press(Qt::Key_F5);
+  EXPECT_TRUE(Tickets().empty());  // no tile picked
+  Click(board, 2, PBoardTypeEx::kBody);
+  board->SetQuantityText(2, L"300");
+  press(Qt::Key_F5);
+  ASSERT_EQ(Tickets().size(), 1u);
+  EXPECT_EQ(Field(Tickets()[0], "Field_instrument_code"), "U11");
+  EXPECT_EQ(Field(Tickets()[0], "Field_side"), "buy");
+  EXPECT_EQ(Field(Tickets()[0], "Field_qty"), "300");
+  EXPECT_EQ(Field(Tickets()[0], "Field_Trade_price"), "3.21");
+  EXPECT_EQ(host.RequestsOf(hm::ShortcutContext).size(), 1u);
+  // A quantity that fails its check: its message, no ticket.
+  board->SetQuantityText(2, L"250");
+  press(Qt::Key_F9);
+  EXPECT_EQ(Tickets().size(), 1u);
+  EXPECT_EQ(Boxes(), (std::vector<QString>{"Shares enter is invalid"}));
 }
 
 TEST_F(Board, Buttons_AnalyticsForTheTerminalsInstrumentsRemoveFromEditableListsTips) {
