@@ -142,6 +142,8 @@ void BoardGrid::TileCell(int index, int* col, int* row) const {
 
 void BoardGrid::LayTiles() {
   const int keep = m_selected;
+  // An open quantity list belongs to a cell that may now hold another tile.
+  if (m_tileType.IsListOpen()) m_tileType.CloseList();
   // Every cell is drawn afresh from the tiles; nothing stays stored.
   ClearStoredCells();
   const int columns = ColumnsFor(width() - 2 * frameWidth(), VScrollBarWidth());
