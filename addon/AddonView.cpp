@@ -12,6 +12,7 @@
 #include "addon/Logging.h"
 #include "addon/TextTables.h"
 #include "data/MarketDelayCache.h"
+#include "data/ProcessState.h"
 #include "data/ReferenceStores.h"
 #include "hostview/HostLists.h"
 #include "hostview/Records.h"
@@ -22,12 +23,16 @@ namespace {
 // Classes that have run their first PrepareBasicData in this process.
 std::set<std::string>& PreparedClasses() {
   static std::set<std::string> classes;
+  static const bool hook = mvd::OnResetForTests([] { classes.clear(); });
+  (void)hook;
   return classes;
 }
 
 // The display mode of the first accepted 519 answer in the process.
 int& ProcessDisplayMode() {
   static int mode = 0;
+  static const bool hook = mvd::OnResetForTests([] { mode = 0; });
+  (void)hook;
   return mode;
 }
 
@@ -265,6 +270,14 @@ void CAddonView::keyPressEvent(QKeyEvent* e) {
 
 // ---- Texts, titles, messages, logs ---------------------------------------------------
 
+std::wstring CAddonView::StyleImagePath(std::wstring path) const {
+  static const std::wstring kPlaceholder = L"[styleID]";
+  const std::wstring id = std::to_wstring(m_styleId);
+  for (std::size_t at = path.find(kPlaceholder); at != std::wstring::npos; at = path.find(kPlaceholder, at + id.size()))
+    path.replace(at, kPlaceholder.size(), id);
+  return path;
+}
+
 std::wstring CAddonView::LanguageText(int entry) const {
   return m_pLanguage ? m_pLanguage->GetText(addon::kLanguageSection, entry) : std::wstring();
 }
@@ -325,6 +338,11 @@ void CAddonView::PrepareBasicData(std::source_location where) {
 }
 
 bool CAddonView::HasPreparedClass(const std::string& className) { return PreparedClasses().count(className) != 0; }
+
+void CAddonView::ResetProcessState() {
+  PreparedClasses().clear();
+  ProcessDisplayMode() = 0;
+}
 
 void CAddonView::SendViewSize(int width, int height) {
   ViewSize size;

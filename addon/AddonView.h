@@ -132,6 +132,8 @@ class CAddonView : public CSuperBaseView, public platform::TimerHandler, public 
   addon::FeedbackSender Sender() {
     return [this](UINT message, LPARAM data) { SendChildFeedback(message, data); };
   }
+  // A style bitmap path with every "[styleID]" replaced by the current style id.
+  std::wstring StyleImagePath(std::wstring path) const;
   // Language text of section 13; empty without a language service.
   std::wstring LanguageText(int entry) const;
   // Stores `title` (GetTitle) and sends it with 101.
@@ -156,6 +158,9 @@ class CAddonView : public CSuperBaseView, public platform::TimerHandler, public 
   void PrepareBasicData(std::source_location where = std::source_location::current());
   // Whether the class's first PrepareBasicData has run in this process.
   static bool HasPreparedClass(const std::string& className);
+  // Forgets the process-wide state of the base (classes prepared, the
+  // display mode answered), as at load. For tests.
+  static void ResetProcessState();
 
  protected:
   // Message 2 / 1. Defaults: PrepareBasicData, plus the active flag.

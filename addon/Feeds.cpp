@@ -19,4 +19,9 @@ std::vector<DepthKey> DepthLevels(const InstrumentKey& key, int first, int last)
   return keys;
 }
 
+std::vector<PageKey> SalesPageFeedTraits::RecordKeys(const InstrumentKey& key, std::int32_t page) {
+  if (!IsPage(page)) return {};
+  return {PageKey{key.ProductID, key.InstrumentCode, page}};
+}
+
 }  // namespace addon

@@ -8,6 +8,14 @@
 //               The price view and the alert views register what they show
 //               and send the quote batches for what TakePending(shown) hands out;
 //               registering a shown instrument again asks for it again.
+//   SalesHeaderFeed, SalesPageFeed  the time-and-sales header and pages (below).
+//   SummaryPageFeed  SummaryHeaderStore; params: a trade-summary page (1..99);
+//               record: the instrument's summary header. The trade-summary
+//               view sends the page request for each pending interest.
+//   SummaryLineFeed  SummaryLineStore, read only: how many lines there are is
+//               known only when they arrive, so nothing is registered; the
+//               trade-summary view makes their records as pages arrive.
+#include <cstdint>
 #include <vector>
 
 #include "addon/StoreFeed.h"
@@ -35,5 +43,39 @@ struct QuoteFeedTraits {
   static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, NoParams) { return {key}; }
 };
 using QuoteFeed = StoreFeed<QuoteFeedTraits>;
+
+// Time and sales: the header of an instrument (the 99999 fields), and its
+// pages (params: history page 1..999 or the live page 99998; any other page
+// has no record). The view sends the header batch and one request per page.
+struct SalesHeaderFeedTraits {
+  using Store = SalesSummaryStore;
+  using Params = NoParams;
+  static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, NoParams) { return {key}; }
+};
+using SalesHeaderFeed = StoreFeed<SalesHeaderFeedTraits>;
+
+struct SalesPageFeedTraits {
+  using Store = SalesPageStore;
+  using Params = std::int32_t;  // the page
+  static constexpr std::int32_t kLivePage = 99998;
+  static constexpr std::int32_t kLastHistoryPage = 999;
+  static bool IsPage(std::int32_t page) { return (page >= 1 && page <= kLastHistoryPage) || page == kLivePage; }
+  static std::vector<PageKey> RecordKeys(const InstrumentKey& key, std::int32_t page);
+};
+using SalesPageFeed = StoreFeed<SalesPageFeedTraits>;
+
+struct SummaryPageFeedTraits {
+  using Store = SummaryHeaderStore;
+  using Params = int;  // the page
+  static std::vector<InstrumentKey> RecordKeys(const InstrumentKey& key, int) { return {key}; }
+};
+using SummaryPageFeed = StoreFeed<SummaryPageFeedTraits>;
+
+struct SummaryLineFeedTraits {
+  using Store = SummaryLineStore;
+  using Params = NoParams;
+  static std::vector<LineKey> RecordKeys(const InstrumentKey&, NoParams) { return {}; }
+};
+using SummaryLineFeed = StoreFeed<SummaryLineFeedTraits>;
 
 }  // namespace addon

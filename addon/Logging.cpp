@@ -5,6 +5,7 @@
 #include <map>
 #include <vector>
 
+#include "data/ProcessState.h"
 #include "hostview/Services.h"
 #include "hostview/Text.h"
 
@@ -13,6 +14,8 @@ namespace {
 
 std::map<std::wstring, ILogger*, std::less<>>& Loggers() {
   static std::map<std::wstring, ILogger*, std::less<>> loggers;
+  static const bool hook = mvd::OnResetForTests([] { loggers.clear(); });
+  (void)hook;
   return loggers;
 }
 

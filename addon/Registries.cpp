@@ -2,6 +2,8 @@
 
 #include <algorithm>
 
+#include "data/ProcessState.h"
+
 namespace addon {
 
 int ViewRegistry::Join(CSuperBaseView* view) {
@@ -29,18 +31,26 @@ std::vector<CSuperBaseView*> ViewRegistry::Views() const {
 
 ViewRegistry& OpenPriceViews() {
   static ViewRegistry registry;
+  static const bool hook = mvd::OnResetForTests([] { registry.ResetForTests(); });
+  (void)hook;
   return registry;
 }
 ViewRegistry& ActiveViews() {
   static ViewRegistry registry;
+  static const bool hook = mvd::OnResetForTests([] { registry.ResetForTests(); });
+  (void)hook;
   return registry;
 }
 ViewRegistry& UserViews() {
   static ViewRegistry registry;
+  static const bool hook = mvd::OnResetForTests([] { registry.ResetForTests(); });
+  (void)hook;
   return registry;
 }
 ViewRegistry& AlertListViews() {
   static ViewRegistry registry;
+  static const bool hook = mvd::OnResetForTests([] { registry.ResetForTests(); });
+  (void)hook;
   return registry;
 }
 

@@ -35,6 +35,11 @@ class ViewRegistry {
   bool Contains(int id) const;
   std::size_t Count() const { return m_members.size(); }
   std::vector<CSuperBaseView*> Views() const;
+  // Empty, ids from 1 again (tests, with every view gone; see data/ProcessState.h).
+  void ResetForTests() {
+    m_members.clear();
+    m_nextId = 1;
+  }
 
  private:
   struct Member {

@@ -36,6 +36,7 @@
 
 #include "data/CellStore.h"
 #include "data/Keys.h"
+#include "data/ProcessState.h"
 
 namespace addon {
 
@@ -67,6 +68,8 @@ class StoreFeed {
   // The process-wide feed over the process-wide store.
   static StoreFeed& Instance() {
     static StoreFeed feed(Store::Instance());
+    static const bool hook = mvd::OnResetForTests([] { feed.Reset(); });
+    (void)hook;
     return feed;
   }
   explicit StoreFeed(Store& store) : m_store(store) {}

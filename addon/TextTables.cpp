@@ -3,12 +3,15 @@
 #include <climits>
 #include <cwctype>
 
+#include "data/ProcessState.h"
 #include "hostview/Services.h"
 
 namespace addon {
 
 SettingTextTable& SettingTextTable::Instance() {
   static SettingTextTable table;
+  static const bool hook = mvd::OnResetForTests([] { table.Clear(); });
+  (void)hook;
   return table;
 }
 
@@ -39,6 +42,8 @@ int SettingTextTable::GetNumber(const std::string& key, int fallback) const {
 
 LanguageTextTable& LanguageTextTable::Instance() {
   static LanguageTextTable table;
+  static const bool hook = mvd::OnResetForTests([] { table.Clear(); });
+  (void)hook;
   return table;
 }
 

@@ -8,6 +8,10 @@
 // instruments after the same changes: "RATIO board_paint <r>" (board time /
 // list time; tiles draw more than rows, so somewhat above 1 is expected).
 //
+// The time-and-sales grid painting its visible rows after scrolling to the
+// middle of a 99,900-trade tape, against the same grid over a 100-trade tape:
+// "RATIO tape_scroll <r>" (about 1 when the cost does not grow with the tape).
+//
 //   build-ui/bin/bench_grid
 // bench-links: mv_addon_objects mv_ui mv_data HostView HostConfig HostTitle platform Qt6::Widgets
 #include <benchmark/benchmark.h>
@@ -24,10 +28,14 @@
 #include <string>
 #include <vector>
 
+#include "data/MarketStores.h"
 #include "data/QuoteStore.h"
 #include "data/ReferenceStores.h"
+#include "data/TradeTape.h"
 #include "grid/GridCtrl.h"
 #include "platform/Platform.h"
+#include "views/instrument/SalesFeed.h"
+#include "views/instrument/TimeASGrid.h"
 #include "views/price/BoardGrid.h"
 #include "views/price/PriceGrid.h"
 #include "views/price/Watchlists.h"
@@ -213,11 +221,86 @@ void PaintAfterChange(benchmark::State& state, Grid& grid) {
   state.SetItemsProcessed(state.iterations());
 }
 
+// ---- trade tape ----------------------------------------------------------------
+
+constexpr int kLongTape = 99900;  // 999 full pages
+constexpr int kShortTape = 100;   // the live page alone
+constexpr int kTapeWidth = 420;
+constexpr int kTapeHeight = 640;  // about 30 visible rows
+
+// A tape of `trades` trades in the shared stores, as the view receives it: the
+// live page text (for the row count) and every trade parsed into TradeTape.
+void FillTape(const InstrumentKey& key, int trades) {
+  TradeTape& tape = TradeTape::Instance();
+  for (int n = 1; n <= trades; ++n) {
+    TradeRecord t;
+    t.number = n;
+    t.time = L"20261207" + std::wstring(n % 2 ? L"10:31:07" : L"10:31:08");
+    t.price = std::to_wstring(12 + n % 50) + L".345";
+    t.volume = std::to_wstring(100 * (1 + n % 37));
+    t.side = std::to_wstring(n % 4);
+    tape.Store(key, std::move(t));
+  }
+  std::wstring live;
+  for (int n = trades; n > std::max(0, trades - 100); --n)
+    live += (live.empty() ? L"" : L";") + std::wstring(L"2026120710:31:07|12.345|100|1||") + std::to_wstring(n);
+  const PageKey page{key.ProductID, key.InstrumentCode, sales::kLivePage};
+  SalesPageStore::Instance().Get(page, 0);
+  SalesPageStore::Instance().Update(page, SalesPageLayout::TradeData, live, 1);
+}
+
+struct TapeFixture {
+  TimeASGrid longGrid;
+  TimeASGrid shortGrid;
+  QImage image{kTapeWidth, kTapeHeight, QImage::Format_ARGB32_Premultiplied};
+  TapeFixture() {
+    const InstrumentKey longKey{3, L"LONGTAPE"};
+    const InstrumentKey shortKey{3, L"SHORTTAPE"};
+    FillTape(longKey, kLongTape);
+    FillTape(shortKey, kShortTape);
+    for (auto [grid, key] : {std::pair{&longGrid, longKey}, std::pair{&shortGrid, shortKey}}) {
+      grid->resize(kTapeWidth, kTapeHeight);
+      grid->SetInstrument(key);
+      grid->NewestStamp();  // the recount sizes the rows
+      grid->show();
+    }
+    // The middle of the long tape; the short one shows its first rows.
+    longGrid.SetTopRow(longGrid.GetNumberRows() / 2);
+  }
+};
+
+std::unique_ptr<TapeFixture> g_tape;
+TapeFixture& T() {
+  if (!g_tape) g_tape = std::make_unique<TapeFixture>();
+  return *g_tape;
+}
+
+void PaintTape(benchmark::State& state, TimeASGrid& grid, int expectedRows) {
+  auto& f = T();
+  if (grid.GetNumberRows() != expectedRows) {
+    state.SkipWithError("the tape was not counted");
+    return;
+  }
+  for (auto _ : state) {
+    QPainter p(&f.image);
+    grid.render(&p);
+    p.end();
+    benchmark::DoNotOptimize(f.image.constBits());
+  }
+  state.SetItemsProcessed(state.iterations());
+}
+
 void BM_BoardPaint(benchmark::State& state) { PaintAfterChange(state, B().board); }
 void BM_ListPaintSameInstruments(benchmark::State& state) { PaintAfterChange(state, B().list); }
 
 BENCHMARK(BM_BoardPaint)->Unit(benchmark::kMillisecond)->MinTime(1.0);
 BENCHMARK(BM_ListPaintSameInstruments)->Unit(benchmark::kMillisecond)->MinTime(1.0);
+
+void BM_TapeScrollLong(benchmark::State& state) { PaintTape(state, T().longGrid, kLongTape); }
+void BM_TapeScrollShort(benchmark::State& state) { PaintTape(state, T().shortGrid, kShortTape); }
+
+BENCHMARK(BM_TapeScrollLong)->Unit(benchmark::kMicrosecond)->MinTime(1.0);
+BENCHMARK(BM_TapeScrollShort)->Unit(benchmark::kMicrosecond)->MinTime(1.0);
 
 // Keeps the time per iteration of every run for the RATIO lines.
 class RatioReporter : public benchmark::ConsoleReporter {
@@ -255,8 +338,16 @@ int main(int argc, char** argv) {
                 kBoardInstruments, boardPaint->second / 1e6, listPaint->second / 1e6);
     std::printf("RATIO board_paint %.3f\n", boardPaint->second / listPaint->second);
   }
+  auto longTape = t.find("BM_TapeScrollLong");
+  auto shortTape = t.find("BM_TapeScrollShort");
+  if (longTape != t.end() && shortTape != t.end() && shortTape->second > 0) {
+    std::printf("tape paint after scrolling: %d trades %.3f ms CPU, %d trades %.3f ms CPU\n", kLongTape,
+                longTape->second / 1e6, kShortTape, shortTape->second / 1e6);
+    std::printf("RATIO tape_scroll %.3f\n", longTape->second / shortTape->second);
+  }
   std::fflush(stdout);
   g_board.reset();
+  g_tape.reset();
   g_fixture.reset();
   benchmark::Shutdown();
   return 0;

@@ -5,10 +5,15 @@
 #include <QBarSet>
 #include <QChart>
 #include <QChartView>
+#include <QHorizontalBarSeries>
 #include <QCursor>
+#include <QFontMetrics>
+#include <QResizeEvent>
 #include <QScrollBar>
 #include <QToolTip>
-#include <QVBoxLayout>
+#include <QGraphicsLayout>
+#include <QGridLayout>
+#include <QLocale>
 #include <QValueAxis>
 #include <QWheelEvent>
 #include <algorithm>
@@ -21,17 +26,18 @@ CBarChart::CBarChart(QWidget* parent) : QWidget(parent) {
   m_chart->legend()->setAlignment(Qt::AlignTop);
   m_chart->setMargins(QMargins(4, 4, 4, 4));
   m_chart->setBackgroundRoundness(0);
-  m_bars = new QBarSeries();
-  m_bars->setBarWidth(0.8);
-  m_chart->addSeries(m_bars);
+  // Every pixel for the bars: small views show ten groups too.
+  m_chart->layout()->setContentsMargins(0, 0, 0, 0);
   m_axisX = new QBarCategoryAxis();
   m_axisY = new QValueAxis();
   m_axisY->setLabelFormat(QStringLiteral("%.0f"));
+  // A price is read whole or not at all.
+  m_axisX->setTruncateLabels(false);
+  // Thousands grouped as in the tables ("100,000").
+  m_chart->setLocale(QLocale(QLocale::English, QLocale::UnitedStates));
+  m_chart->setLocalizeNumbers(true);
   m_axisY->setRange(0, 1);
-  m_chart->addAxis(m_axisX, Qt::AlignBottom);
-  m_chart->addAxis(m_axisY, Qt::AlignLeft);
-  m_bars->attachAxis(m_axisX);
-  m_bars->attachAxis(m_axisY);
+  MakeSeries();
 
   m_view = new QChartView(m_chart, this);
   m_view->setRenderHint(QPainter::Antialiasing, true);
@@ -39,23 +45,135 @@ CBarChart::CBarChart(QWidget* parent) : QWidget(parent) {
   m_scroll = new QScrollBar(Qt::Horizontal, this);
   m_scroll->setRange(0, 0);
   connect(m_scroll, &QScrollBar::valueChanged, this, [this](int v) {
-    if (!m_updatingScroll) SetScrollPos(v);
+    if (!m_updatingScroll) UserScroll(v);
   });
-  auto* layout = new QVBoxLayout(this);
-  layout->setContentsMargins(0, 0, 0, 0);
-  layout->setSpacing(0);
-  layout->addWidget(m_view, 1);
-  layout->addWidget(m_scroll);
+  m_layout = new QGridLayout(this);
+  m_layout->setContentsMargins(0, 0, 0, 0);
+  m_layout->setSpacing(0);
+  m_layout->addWidget(m_view, 0, 0);
+  m_layout->addWidget(m_scroll, 1, 0);
+  SetPalette(m_palette);
+  UpdateScrollBar();
+}
 
+// The bar series of the orientation, with the category axis along the groups
+// and the value axis along the bars.
+void CBarChart::MakeSeries() {
+  if (m_bars) {
+    m_chart->removeSeries(m_bars);
+    delete m_bars;
+    m_bars = nullptr;
+  }
+  for (QAbstractAxis* axis : m_chart->axes()) m_chart->removeAxis(axis);
+  const bool horizontal = m_orientation == Qt::Horizontal;
+  if (horizontal) m_bars = new QHorizontalBarSeries();
+  else m_bars = new QBarSeries();
+  m_bars->setBarWidth(0.8);
+  m_chart->addSeries(m_bars);
+  m_chart->addAxis(m_axisX, horizontal ? Qt::AlignLeft : Qt::AlignBottom);
+  m_chart->addAxis(m_axisY, horizontal ? Qt::AlignBottom : Qt::AlignLeft);
+  m_bars->attachAxis(m_axisX);
+  m_bars->attachAxis(m_axisY);
   // One tooltip per bar group, whichever series' bar the pointer is on.
-  connect(m_bars, &QBarSeries::hovered, this, [this](bool status, int index, QBarSet*) {
-    const auto visible = VisibleGroups();
+  connect(m_bars, &QAbstractBarSeries::hovered, this, [this](bool status, int index, QBarSet*) {
+    const auto visible = DrawnGroups();
     if (status && index >= 0 && index < int(visible.size()))
       QToolTip::showText(QCursor::pos(), TooltipOf(visible[std::size_t(index)]), m_view);
     else
       QToolTip::hideText();
   });
-  UpdateScrollBar();
+}
+
+void CBarChart::SetOrientation(Qt::Orientation orientation) {
+  if (orientation == m_orientation) return;
+  m_orientation = orientation;
+  // The scroll bar runs along the groups: under them or beside them.
+  m_layout->removeWidget(m_scroll);
+  if (orientation == Qt::Horizontal) {
+    m_scroll->setOrientation(Qt::Vertical);
+    m_layout->addWidget(m_scroll, 0, 1);
+  } else {
+    m_scroll->setOrientation(Qt::Horizontal);
+    m_layout->addWidget(m_scroll, 1, 0);
+  }
+  MakeSeries();
+  Rebuild();
+}
+
+void CBarChart::SetPalette(const Palette& palette) {
+  m_palette = palette;
+  m_chart->setBackgroundBrush(palette.back);
+  m_chart->setBackgroundPen(Qt::NoPen);
+  m_chart->setPlotAreaBackgroundVisible(false);
+  m_chart->setTitleBrush(palette.text);
+  m_chart->legend()->setLabelColor(palette.text);
+  for (QAbstractAxis* axis : {static_cast<QAbstractAxis*>(m_axisX), static_cast<QAbstractAxis*>(m_axisY)}) {
+    axis->setLabelsColor(palette.text);
+    axis->setLinePenColor(palette.gridLine);
+    axis->setGridLineColor(palette.gridLine);
+  }
+  if (m_view) {
+    m_view->setBackgroundBrush(palette.back);
+    QPalette p = m_view->palette();
+    p.setColor(QPalette::Window, palette.back);
+    p.setColor(QPalette::Base, palette.back);
+    m_view->setPalette(p);
+  }
+  QPalette own = this->palette();
+  own.setColor(QPalette::Window, palette.back);
+  setPalette(own);
+  setAutoFillBackground(true);
+  update();
+}
+
+void CBarChart::SetLabelFont(const QFont& font) {
+  m_chart->legend()->setFont(font);
+  m_axisX->setLabelsFont(font);
+  m_axisY->setLabelsFont(font);
+  FitTicks();
+}
+
+void CBarChart::FitTicks() {
+  // Value labels such as "100,000" need about this much room each.
+  const QFontMetrics metrics(m_axisY->labelsFont());
+  const int room = m_orientation == Qt::Horizontal ? m_view->width() - 80 : m_view->height() - 60;
+  const int each = m_orientation == Qt::Horizontal ? metrics.horizontalAdvance(QStringLiteral("000,000")) + 16
+                                                   : metrics.height() * 2;
+  const int ticks = std::clamp(room / std::max(1, each), 2, 6);
+  if (ticks != m_ticks) {
+    m_ticks = ticks;
+    Rebuild();
+  }
+}
+
+void CBarChart::resizeEvent(QResizeEvent* e) {
+  QWidget::resizeEvent(e);
+  FitTicks();
+}
+
+QStringList CBarChart::AxisLabels() const { return m_axisX->categories(); }
+
+QString CBarChart::dumpTsv() const {
+  auto clean = [](QString text) { return text.replace('\t', ' ').replace('\r', ' ').replace('\n', ' '); };
+  QStringList head{QString()};
+  for (const Series& s : m_series) head << clean(s.legend);
+  QString out = head.join('\t') + '\n';
+  for (int g : VisibleGroups()) {
+    const Group& group = m_groups[std::size_t(g)];
+    QStringList line{clean(group.label)};
+    for (int s = 0; s < SeriesCount(); ++s) {
+      const double v = std::size_t(s) < group.values.size() ? group.values[std::size_t(s)] : 0.0;
+      line << (std::isfinite(v) ? QString::number(v, 'f', v == std::trunc(v) ? 0 : 6) : QStringLiteral("0"));
+    }
+    out += line.join('\t') + '\n';
+  }
+  return out;
+}
+
+void CBarChart::UserScroll(int first) {
+  const int before = m_first;
+  SetScrollPos(first);
+  if (m_first != before) emit scrollPosChanged(m_first);
 }
 
 CBarChart::~CBarChart() = default;
@@ -139,9 +257,16 @@ void CBarChart::UpdateScrollBar() {
   m_updatingScroll = false;
 }
 
+std::vector<int> CBarChart::DrawnGroups() const {
+  auto groups = VisibleGroups();
+  // Categories run upwards along a vertical axis: the first group belongs at the top.
+  if (m_orientation == Qt::Horizontal) std::reverse(groups.begin(), groups.end());
+  return groups;
+}
+
 void CBarChart::Rebuild() {
   m_bars->clear();  // deletes the old sets
-  const auto visible = VisibleGroups();
+  const auto visible = DrawnGroups();
   double top = 0.0;
   QStringList labels;
   for (int g : visible) labels << m_groups[std::size_t(g)].label;
@@ -169,12 +294,13 @@ void CBarChart::Rebuild() {
   m_axisX->append(unique.isEmpty() ? QStringList{QString()} : unique);
   double max = top > m_min ? m_min + (top - m_min) * (1.0 + m_headroom / 100.0) : m_min + 1.0;
   m_axisY->setRange(m_min, max);
+  m_axisY->setTickCount(m_ticks);
   m_axisY->applyNiceNumbers();
   if (m_axisY->min() < m_min) m_axisY->setMin(m_min);
 }
 
 void CBarChart::wheelEvent(QWheelEvent* e) {
   const int steps = e->angleDelta().y() / 120;
-  if (steps) SetScrollPos(m_first - steps);
+  if (steps) UserScroll(m_first - steps);
   e->accept();
 }

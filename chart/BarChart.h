@@ -3,6 +3,12 @@
 // groups of one bar per series with a label and a tooltip, and a window of a
 // fixed number of groups starting at a scroll position. A scroll bar under the
 // chart (and the wheel) moves the window.
+//
+// Vertical (default): groups along the bottom, bars upwards. Horizontal: groups
+// down the left side, the first shown group at the top, bars to the right (a
+// volume profile).
+#include <QColor>
+#include <QFont>
 #include <QString>
 #include <QStringList>
 #include <QWidget>
@@ -13,11 +19,12 @@
 
 class QChart;
 class QChartView;
-class QBarSeries;
+class QAbstractBarSeries;
 class QBarSet;
 class QBarCategoryAxis;
 class QValueAxis;
 class QScrollBar;
+class QGridLayout;
 
 class CBarChart : public QWidget {
   Q_OBJECT
@@ -60,6 +67,21 @@ class CBarChart : public QWidget {
   double AxisMin() const;
   double AxisMax() const;
 
+  // Where the groups run (see the file comment).
+  void SetOrientation(Qt::Orientation orientation);
+  Qt::Orientation Orientation() const { return m_orientation; }
+
+  // Colours of everything but the bars (background, texts, grid lines).
+  struct Palette {
+    QColor back{255, 255, 255};
+    QColor text{0, 0, 0};
+    QColor gridLine{214, 219, 227};
+  };
+  void SetPalette(const Palette& palette);
+  // Font of the legend and the axis labels.
+  void SetLabelFont(const QFont& font);
+  const Palette& GetPalette() const { return m_palette; }
+
   // Drops the groups (the series stay).
   void Clear();
   // Rebuilds the bars of the window and repaints now.
@@ -69,9 +91,23 @@ class CBarChart : public QWidget {
 
   QChart* Chart() const { return m_chart; }
   QChartView* View() const { return m_view; }
+  QAbstractBarSeries* Bars() const { return m_bars; }
+  // The scroll bar along the groups (shown while they do not all fit).
+  QScrollBar* ScrollBar() const { return m_scroll; }
+  // The category texts in axis order (bottom to top when horizontal).
+  QStringList AxisLabels() const;
+  // The shown window as the user reads it, tab-separated: a heading line (an
+  // empty cell, then the series legends), then one line per shown group (its
+  // label, then its values). The terminal's --dump finds it.
+  Q_INVOKABLE QString dumpTsv() const;
+
+ signals:
+  // The user moved the window (scroll bar or wheel); not sent for SetScrollPos.
+  void scrollPosChanged(int first);
 
  protected:
   void wheelEvent(QWheelEvent* e) override;
+  void resizeEvent(QResizeEvent* e) override;
 
  private:
   struct Series {
@@ -80,6 +116,12 @@ class CBarChart : public QWidget {
   };
   void Rebuild();
   void UpdateScrollBar();
+  void MakeSeries();
+  // The visible groups in the order of their categories on the axis.
+  std::vector<int> DrawnGroups() const;
+  void UserScroll(int first);
+  // As many value ticks as the value axis has room for.
+  void FitTicks();
 
   std::vector<Series> m_series;
   std::vector<Group> m_groups;
@@ -87,11 +129,15 @@ class CBarChart : public QWidget {
   int m_first = 0;
   double m_min = 0.0;
   double m_headroom = 20.0;
+  Qt::Orientation m_orientation = Qt::Vertical;
+  int m_ticks = 5;  // value-axis ticks wanted
+  Palette m_palette;
   QChart* m_chart = nullptr;
   QChartView* m_view = nullptr;
-  QBarSeries* m_bars = nullptr;
+  QAbstractBarSeries* m_bars = nullptr;
   QBarCategoryAxis* m_axisX = nullptr;
   QValueAxis* m_axisY = nullptr;
   QScrollBar* m_scroll = nullptr;
+  QGridLayout* m_layout = nullptr;
   bool m_updatingScroll = false;
 };

@@ -56,7 +56,9 @@ function(mv_library)
 endfunction()
 
 # mv_test(NAME <target> SOURCES ... DEPS ... LABELS ...)
-# One gtest executable; every test case runs in its own process (clean statics).
+# One gtest executable; every test case runs in its own process (clean statics),
+# and the whole executable runs once more as one process (test <target>, label
+# "whole"): what a developer running the binary gets must be the same.
 # Tests find the build's lib/ and bin/ next to their own folder (<build>/tests);
 # MV_ADDON and MV_BIN override that when set by hand.
 function(mv_test)
@@ -68,6 +70,8 @@ function(mv_test)
   gtest_discover_tests(${A_NAME}
     DISCOVERY_TIMEOUT 60
     PROPERTIES LABELS "${A_LABELS}" ENVIRONMENT "QT_QPA_PLATFORM=offscreen")
+  add_test(NAME ${A_NAME} COMMAND ${A_NAME})
+  set_tests_properties(${A_NAME} PROPERTIES LABELS "${A_LABELS};whole" ENVIRONMENT "QT_QPA_PLATFORM=offscreen")
 endfunction()
 
 # Subfolders with a CMakeLists.txt, added in name order.

@@ -1,11 +1,9 @@
 #include "controls/BoardTypeEx.h"
 
-#include <QApplication>
 #include <QLinearGradient>
 #include <QLocale>
 #include <cmath>
 #include <QPainterPath>
-#include <QStyle>
 #include <mutex>
 
 #include "data/MarketDelayCache.h"
@@ -74,10 +72,7 @@ QString PBoardTypeEx::CodeText(const JInstrumentUnderlying& instrument) {
   return Q(hv::Widen(instrument.displayCode.empty() ? instrument.symbol : instrument.displayCode)).trimmed();
 }
 
-PBoardTypeEx::PBoardTypeEx(CGridCtrl* grid) : CGridDropListType(grid), m_companyInfo(kCompanyInfoPicture) {
-  m_face = QApplication::palette().color(QPalette::Button);
-  m_scrollBarWidth = QApplication::style()->pixelMetric(QStyle::PM_ScrollBarExtent);
-}
+PBoardTypeEx::PBoardTypeEx(CGridCtrl* grid) : CGridDropListType(grid), m_companyInfo(kCompanyInfoPicture) {}
 
 PBoardTypeEx::~PBoardTypeEx() = default;
 
@@ -243,7 +238,6 @@ void PBoardTypeEx::OnMouseMove(int col, int row, const QRect& rect, const QPoint
   m_hot86 = h86;
   m_hotCol = col;
   m_hotRow = row;
-  m_tracking = col >= 0;
 }
 
 void PBoardTypeEx::OnDropListSelected(int col, int row, int index, const QString& text) {

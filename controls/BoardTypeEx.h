@@ -118,13 +118,9 @@ class PBoardTypeEx : public CGridDropListType, public CStyledCellType {
   std::function<QStringList(int, int)> m_quantities;
   // The hot areas last reported: cell, and the areas of codes 85 and 86.
   std::int32_t m_hotCol = -1, m_hotRow = -1, m_hot85 = -1, m_hot86 = -1;
-  bool m_listForPress = false;  // the press opened or closed the list
-  bool m_tracking = false;
   int m_state = 0;
   int m_pressCol = -1, m_pressRow = -1;
   Area m_lastPress = kNone;
-  QColor m_face;  // background brush and pen colour
-  int m_scrollBarWidth = 0;
   CStyleImage m_companyInfo;
   std::map<std::wstring, CStyleImage> m_productImages;
   std::set<std::pair<std::int64_t, std::string>> m_asked;  // market delays asked once per key

@@ -95,6 +95,8 @@ CInstrumentComboBox::CInstrumentComboBox(QWidget* parent) : CSkinComboBox(parent
   if (auto* list = qobject_cast<QListView*>(view())) list->setUniformItemSizes(true);
   setMaxVisibleItems(10);
   lineEdit()->installEventFilter(this);
+  // The open drop-down takes the keyboard; typing still belongs to the edit.
+  view()->installEventFilter(this);
   // Only the user's edits start a search; texts set here do not.
   connect(lineEdit(), &QLineEdit::textEdited, this, &CInstrumentComboBox::OnTextEdited);
   connect(this, qOverload<int>(&QComboBox::activated), this, [this](int) {
@@ -122,7 +124,10 @@ void CInstrumentComboBox::AttachList(const std::vector<JInstrumentUnderlying>* l
   platform::KillTimer(this, kSearchTimer);
   m_list = list;
   m_products = std::move(productMap);
-  m_index.Clear();
+  // The texts are copied now; the lookup lists are built in the background
+  // while the user has not typed yet.
+  if (list) m_index.StartBuild(*list);
+  else m_index.Clear();
   const int n = list ? int(list->size()) : 0;
   m_added.assign(std::size_t(n), 0);
   m_model->SetSource(list, &m_products);
@@ -250,13 +255,6 @@ void CInstrumentComboBox::OnTextEdited(const QString& text) {
   ApplyEditColors();
   platform::KillTimer(this, kSearchTimer);
   if (text != m_lastSearch) platform::SetTimer(this, kSearchTimer, kTypingPauseMs);
-  m_typed = true;
-}
-
-void CInstrumentComboBox::showPopup() {
-  m_typedBeforeDrop = m_typed;
-  m_typed = false;
-  CSkinComboBox::showPopup();
 }
 
 void CInstrumentComboBox::OnTimer(UINT id) {
@@ -287,7 +285,6 @@ void CInstrumentComboBox::RunSearch() {
     found.resize(m_list->size());
     std::iota(found.begin(), found.end(), 0);
   } else if (m_list) {
-    if (!m_index.IsBuilt()) m_index.Build(*m_list);
     found = m_index.Search(key);
   }
   {
@@ -318,7 +315,38 @@ void CInstrumentComboBox::RunSearch() {
   setCursor(Qt::ArrowCursor);
 }
 
+namespace {
+// Keys the open drop-down keeps: moving in the list, choosing, closing.
+bool IsListKey(const QKeyEvent* k) {
+  switch (k->key()) {
+    case Qt::Key_Up:
+    case Qt::Key_Down:
+    case Qt::Key_PageUp:
+    case Qt::Key_PageDown:
+    case Qt::Key_Return:
+    case Qt::Key_Enter:
+    case Qt::Key_Escape:
+    case Qt::Key_F4:
+    case Qt::Key_Tab:
+    case Qt::Key_Backtab:
+      return true;
+    default:
+      return false;
+  }
+}
+}  // namespace
+
 bool CInstrumentComboBox::eventFilter(QObject* obj, QEvent* e) {
+  if (obj == view() && (e->type() == QEvent::KeyPress || e->type() == QEvent::KeyRelease ||
+                        e->type() == QEvent::ShortcutOverride)) {
+    // Every other key edits the search text, so typing goes on while the
+    // list is open; the search then refits the list.
+    if (!IsListKey(static_cast<QKeyEvent*>(e))) {
+      QApplication::sendEvent(lineEdit(), e);
+      return true;
+    }
+    return CSkinComboBox::eventFilter(obj, e);
+  }
   if (obj == lineEdit()) {
     if (e->type() == QEvent::FocusIn) {
       if (lineEdit()->text() == PlaceholderText()) {

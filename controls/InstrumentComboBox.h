@@ -81,12 +81,10 @@ class CInstrumentComboBox : public CSkinComboBox, public platform::TimerHandler 
   int ItemCount() const { return m_model->rowCount(); }
   QString ItemTextAt(int item) const;
   bool IsFilling() const { return platform::HasTimer(const_cast<CInstrumentComboBox*>(this), kFillTimer); }
-  bool TypedBeforeDrop() const { return m_typedBeforeDrop; }
   // Runs the search now (what the typing pause leads to).
   void RunSearch();
 
   void OnTimer(UINT id) override;
-  void showPopup() override;
 
  signals:
   // The user chose an item from the drop-down (the selection-end notification).
@@ -106,14 +104,12 @@ class CInstrumentComboBox : public CSkinComboBox, public platform::TimerHandler 
   const std::vector<JInstrumentUnderlying>* m_list = nullptr;
   std::map<std::int64_t, JProduct> m_products;
   CInstrumentListModel* m_model = nullptr;
-  InstrumentSearchIndex m_index;  // built on the first search after attaching
+  InstrumentSearchIndex m_index;  // started when the list is attached
   std::vector<char> m_added;
   int m_fillPos = 0;
   bool m_filling = false;
   QString m_lastSearch;
   bool m_placeholderShown = false;
-  bool m_typed = false;
-  bool m_typedBeforeDrop = false;
   ILanguage* m_language = nullptr;
   QColor m_textColor{0, 0, 0};
   QColor m_backColor{255, 255, 255};

@@ -23,6 +23,7 @@
 
 #include "data/Keys.h"
 #include "data/NumberText.h"
+#include "data/ProcessState.h"
 
 // Change marks.
 enum : std::int32_t { kMarkNone = 0, kMarkChanged = 1, kMarkUp = 2, kMarkDown = 3 };
@@ -116,7 +117,9 @@ class CellStore {
 
   // Decodes one field value into the record of `key`. Records are created only
   // by Get: an update for an unknown key is dropped. Returns whether the record
-  // changed. A numeric value that is not a finite number leaves the cell as it was.
+  // changed. An empty (or blank) numeric value reads as 0: the terminal sends it
+  // when it withdraws a price. Any other text that is not a finite number
+  // leaves the cell as it was.
   bool Update(const Key& key, std::wstring_view field, std::wstring_view value, std::uint32_t now);
   bool Update(const Key& key, int fieldIndex, std::wstring_view value, std::uint32_t now);
 
@@ -182,6 +185,9 @@ class CellStore {
   // Every key as " [<product id> | <code>]".
   std::wstring Dump() const;
 
+  // Empty, as when first made (tests; see data/ProcessState.h).
+  void ResetForTests();
+
  private:
   Record MakeDefault(const Key& key, std::uint32_t now) const;
   void Touch(Record& r, std::uint32_t now);
@@ -213,7 +219,20 @@ int InstrumentDecimals(const InstrumentKey& key);  // ReferenceStores.cpp
 template <class L>
 CellStore<L>& CellStore<L>::Instance() {
   static CellStore store;
+  static const bool hook = mvd::OnResetForTests([] { store.ResetForTests(); });
+  (void)hook;
   return store;
+}
+
+template <class L>
+void CellStore<L>::ResetForTests() {
+  std::lock_guard lock(mu_);
+  map_.clear();
+  records_.clear();
+  pending_.clear();
+  marked_.clear();
+  changed_.clear();
+  version_.store(0, std::memory_order_release);
 }
 
 template <class L>
@@ -223,7 +242,7 @@ template <class L>
 bool CellStore<L>::Update(const Key& key, std::wstring_view field, std::wstring_view value, std::uint32_t now) {
   if (field.empty()) return false;
   const int idx = FieldIndex(field);
-  if (idx < 0 && !(L::kEmptyValueTouches && value.empty())) return false;
+  if (idx < 0 && !(L::kEmptyValueTouches && mvd::IsBlank(value))) return false;
   return Update(key, idx, value, now);
 }
 
@@ -236,7 +255,7 @@ bool CellStore<L>::Update(const Key& key, int idx, std::wstring_view value, std:
   Record& r = *it->second;
   if constexpr (L::kEmptyValueTouches) {
     // An empty value withdraws the level's price text and tells the view to repaint.
-    if (value.empty()) {
+    if (mvd::IsBlank(value)) {
       if (idx >= 0 && L::kCells[idx].clearOnEmpty) r.cells[idx].text.clear();
       r.readAt = now;
       Touch(r, now);
@@ -258,7 +277,7 @@ bool CellStore<L>::Decode(Record& r, int idx, std::wstring_view value, std::uint
     c.text.assign(value);
   } else {
     double v = 0.0;
-    if (!mvd::ParseNumber(value, v)) return false;
+    if (!mvd::IsBlank(value) && !mvd::ParseNumber(value, v)) return false;
     if (spec.kind == CellKind::Whole) {
       v = std::trunc(v);
       // Beyond the 64-bit range there is no whole number to show.

@@ -1,7 +1,11 @@
 #include "data/MarketDelayCache.h"
 
+#include "data/ProcessState.h"
+
 MarketDelayCache& MarketDelayCache::Instance() {
   static MarketDelayCache cache;
+  static const bool hook = mvd::OnResetForTests([] { cache.Clear(); });
+  (void)hook;
   return cache;
 }
 

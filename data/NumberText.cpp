@@ -52,6 +52,12 @@ bool Parse(std::basic_string_view<Char> text, double& out) {
 }  // namespace
 
 bool ParseNumber(std::wstring_view text, double& out) noexcept { return Parse(text, out); }
+
+bool IsBlank(std::wstring_view text) noexcept {
+  for (wchar_t c : text)
+    if (!IsBlank(static_cast<unsigned>(c))) return false;
+  return true;
+}
 bool ParseNumber(std::string_view text, double& out) noexcept { return Parse(text, out); }
 
 std::wstring NumberFormat(int decimals) { return L"%." + std::to_wstring(decimals) + L"f"; }

@@ -15,6 +15,9 @@ namespace mvd {
 bool ParseNumber(std::wstring_view text, double& out) noexcept;
 bool ParseNumber(std::string_view text, double& out) noexcept;
 
+// True for a text of blanks only (or none): a withdrawn value.
+bool IsBlank(std::wstring_view text) noexcept;
+
 // The decimals a record's number format uses for an instrument's decimals:
 // the same when 0..10, otherwise 3.
 constexpr int RecordDecimals(int instrumentDecimals) noexcept {

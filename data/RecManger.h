@@ -75,6 +75,15 @@ class RecManger {
   bool IsLoaded() const { return loaded_; }
   std::int32_t Version() const { return version_; }
 
+  // Empty, not loaded, version 0: as when first made (tests; see
+  // data/ProcessState.h). What keeps a version seen must be reset with it.
+  void ResetForTests() {
+    records_.clear();
+    index_.clear();
+    loaded_ = false;
+    version_ = 0;
+  }
+
  private:
   bool InRange(std::int32_t i) const { return i >= 0 && static_cast<std::size_t>(i) < records_.size(); }
   void Reindex() {
@@ -138,6 +147,14 @@ class RecManger_ReadOnly {
   const std::vector<R>* Source() const { return list_; }
   bool IsLoaded() const { return loaded_; }
   std::int32_t Version() const { return version_; }
+
+  // No list, not loaded, version 0: as when first made (tests).
+  void ResetForTests() {
+    list_ = nullptr;
+    index_.clear();
+    loaded_ = false;
+    version_ = 0;
+  }
 
  private:
   bool loaded_ = false;

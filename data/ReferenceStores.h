@@ -6,6 +6,7 @@
 #include <string>
 
 #include "data/Keys.h"
+#include "data/ProcessState.h"
 #include "data/RecManger.h"
 #include "hostview/Records.h"
 
@@ -80,11 +81,17 @@ using PriceAlertStore = KeyedRecManger<std::int32_t, R, AlertKeyOf<R>>;
 template <class R>
 WatchlistStore<R>& WatchlistMgr(WatchlistFamily family) {
   static WatchlistStore<R> stores[4];
+  static const bool hook = mvd::OnResetForTests([] {
+    for (auto& s : stores) s.ResetForTests();
+  });
+  (void)hook;
   return stores[std::clamp(static_cast<int>(family), 0, 3)];
 }
 
 template <class R>
 PriceAlertStore<R>& PriceAlertMgr() {
   static PriceAlertStore<R> store;
+  static const bool hook = mvd::OnResetForTests([] { store.ResetForTests(); });
+  (void)hook;
   return store;
 }

@@ -10,7 +10,7 @@ packages=(
   g++ cmake ninja-build pkg-config binutils
   qt6-base-dev qt6-charts-dev libqt6opengl6-dev libgl-dev
   libjsoncpp-dev libfmt-dev libspdlog-dev libsqlite3-dev
-  libgtest-dev libgmock-dev libbenchmark-dev
+  libgtest-dev libgmock-dev libbenchmark-dev libzstd-dev
   fonts-dejavu-core
 )
 

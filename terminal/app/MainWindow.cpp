@@ -4,6 +4,7 @@
 #include <QActionGroup>
 #include <QApplication>
 #include <QCloseEvent>
+#include <QLabel>
 #include <QMenuBar>
 #include <QMimeData>
 #include <QStatusBar>
@@ -12,12 +13,14 @@
 
 namespace term {
 
+QString MenuText(QString text) { return text.replace('&', QStringLiteral("&&")); }
+
 // ---- ViewDock ---------------------------------------------------------------
 
-ViewDock::ViewDock(CSuperBaseView* view, const QString& className, int instance, QWidget* parent)
-    : QDockWidget(parent), m_view(view), m_className(className), m_instance(instance) {
+ViewDock::ViewDock(CSuperBaseView* view, const QString& className, const QString& name, int instance, QWidget* parent)
+    : QDockWidget(parent), m_view(view), m_className(className), m_name(name), m_instance(instance) {
   setObjectName(QString("dock-%1-%2").arg(className).arg(instance));
-  setWindowTitle(instance > 1 ? QString("%1 %2").arg(className).arg(instance) : className);
+  setWindowTitle(name);
   setFeatures(QDockWidget::DockWidgetClosable | QDockWidget::DockWidgetMovable | QDockWidget::DockWidgetFloatable);
   setAcceptDrops(true);
   setWidget(view);
@@ -53,7 +56,7 @@ void ViewDock::dropEvent(QDropEvent* event) {
 
 // ---- MainWindow -------------------------------------------------------------
 
-MainWindow::MainWindow(const QStringList& addonClasses, const QStringList& terminalClasses,
+MainWindow::MainWindow(const std::vector<ViewClass>& addonClasses, const std::vector<ViewClass>& terminalClasses,
                        const std::vector<Style>& styles, int currentStyle) {
   setObjectName("terminal-main-window");
   setWindowTitle("Brantic Terminal");
@@ -63,7 +66,10 @@ MainWindow::MainWindow(const QStringList& addonClasses, const QStringList& termi
   setTabPosition(Qt::AllDockWidgetAreas, QTabWidget::North);
   resize(1400, 900);
   BuildMenus(addonClasses, terminalClasses, styles, currentStyle);
-  statusBar()->showMessage("Ready");
+  // The active view's title stays in the status bar; notices show over it for a while.
+  m_activeTitle = new QLabel(this);
+  m_activeTitle->setObjectName("active-view-title");
+  statusBar()->addWidget(m_activeTitle, 1);
   connect(qApp, &QApplication::focusChanged, this, &MainWindow::OnFocusChanged);
   qApp->installEventFilter(this);
   // Clicking a tab of tabbed docks activates that view.
@@ -79,7 +85,7 @@ MainWindow::~MainWindow() {
   for (ViewDock* d : Docks()) disconnect(d, nullptr, this, nullptr);
 }
 
-void MainWindow::BuildMenus(const QStringList& addonClasses, const QStringList& terminalClasses,
+void MainWindow::BuildMenus(const std::vector<ViewClass>& addonClasses, const std::vector<ViewClass>& terminalClasses,
                             const std::vector<Style>& styles, int currentStyle) {
   QMenu* file = menuBar()->addMenu("&File");
   file->addAction("&Settings...", this, &MainWindow::settingsRequested);
@@ -88,15 +94,17 @@ void MainWindow::BuildMenus(const QStringList& addonClasses, const QStringList& 
   QAction* quit = file->addAction("&Quit", this, &QWidget::close);
   quit->setShortcut(QKeySequence::Quit);
 
-  QMenu* view = menuBar()->addMenu("&View");
-  auto addOpen = [&](const QString& cls) {
-    QAction* a = view->addAction(cls);
-    a->setObjectName("open-" + cls);
-    connect(a, &QAction::triggered, this, [this, cls] { emit openRequested(cls); });
+  m_viewMenu = menuBar()->addMenu("&View");
+  auto addOpen = [&](const ViewClass& c) {
+    m_names[c.className] = c.name;
+    QAction* a = m_viewMenu->addAction(MenuText(c.name));
+    a->setObjectName("open-" + c.className);
+    a->setStatusTip(c.className);
+    connect(a, &QAction::triggered, this, [this, cls = c.className] { emit openRequested(cls); });
   };
-  for (const QString& cls : addonClasses) addOpen(cls);
-  view->addSeparator();
-  for (const QString& cls : terminalClasses) addOpen(cls);
+  for (const ViewClass& c : addonClasses) addOpen(c);
+  m_viewMenu->addSeparator();
+  for (const ViewClass& c : terminalClasses) addOpen(c);
 
   QMenu* display = menuBar()->addMenu("&Display");
   auto* group = new QActionGroup(this);
@@ -120,7 +128,7 @@ void MainWindow::BuildMenus(const QStringList& addonClasses, const QStringList& 
     });
     m_windowMenu->addSeparator();
     for (ViewDock* d : Docks()) {
-      QAction* a = m_windowMenu->addAction(d->windowTitle());
+      QAction* a = m_windowMenu->addAction(MenuText(d->windowTitle()));
       connect(a, &QAction::triggered, this, [this, p = QPointer<ViewDock>(d)] {
         if (p) ActivateView(p->View());
       });
@@ -141,7 +149,7 @@ ViewDock* MainWindow::AddView(CSuperBaseView* view, const QString& className, co
     for (ViewDock* d : Docks())
       if (d->ClassName() == className && d->Instance() == instance) { taken = true; ++instance; break; }
   }
-  auto* dock = new ViewDock(view, className, instance, this);
+  auto* dock = new ViewDock(view, className, NameOf(className), instance, this);
   // Tab it with the newest dock of the same class. Otherwise it gets a place of
   // its own in its side of the window, up to three per side; beyond that it is
   // tabbed with the last one so no view is squeezed to nothing.
@@ -180,8 +188,36 @@ ViewDock* MainWindow::AddView(CSuperBaseView* view, const QString& className, co
     if (d->View()) emit dropRequested(d->View(), source, link);
   });
   dock->show();
+  RefreshTitles();
   return dock;
 }
+
+QString MainWindow::NameOf(const QString& className) const {
+  auto it = m_names.find(className);
+  return it == m_names.end() || it->second.isEmpty() ? className : it->second;
+}
+
+void MainWindow::SetClassNames(const std::vector<ViewClass>& classes) {
+  for (const ViewClass& c : classes) {
+    m_names[c.className] = c.name;
+    if (QAction* a = m_viewMenu->findChild<QAction*>("open-" + c.className)) a->setText(MenuText(NameOf(c.className)));
+  }
+  for (ViewDock* d : Docks()) d->SetName(NameOf(d->ClassName()));
+  RefreshTitles();
+}
+
+void MainWindow::RefreshTitles() {
+  std::map<QString, int> seen;
+  for (ViewDock* d : Docks()) {
+    const QString base = d->BaseTitle();
+    const int n = ++seen[base];
+    const QString title = n > 1 ? QString("%1 %2").arg(base).arg(n) : base;
+    if (d->windowTitle() != title) d->setWindowTitle(title);
+  }
+  m_activeTitle->setText(ActiveTitle());
+}
+
+QString MainWindow::ActiveTitle() const { return m_active && m_active->View() ? m_active->windowTitle() : QString(); }
 
 std::vector<ViewDock*> MainWindow::Docks() const {
   std::vector<ViewDock*> out;
@@ -203,7 +239,10 @@ ViewDock* MainWindow::DockAt(QObject* o) const {
 }
 
 void MainWindow::SetViewTitle(CSuperBaseView* view, const QString& title) {
-  if (ViewDock* d = DockOf(view); d && !title.isEmpty()) d->setWindowTitle(title);
+  ViewDock* d = DockOf(view);
+  if (!d) return;
+  d->SetViewTitle(title.trimmed());
+  RefreshTitles();
 }
 
 CSuperBaseView* MainWindow::ActiveView() const { return m_active ? m_active->View() : nullptr; }
@@ -221,10 +260,8 @@ void MainWindow::SetActiveDock(ViewDock* dock) {
   ViewDock* old = m_active;
   m_active = dock;
   if (old && old->View()) emit activationChanged(old->View(), false);
-  if (dock && dock->View()) {
-    emit activationChanged(dock->View(), true);
-    statusBar()->showMessage(dock->windowTitle());
-  }
+  if (dock && dock->View()) emit activationChanged(dock->View(), true);
+  m_activeTitle->setText(ActiveTitle());
 }
 
 void MainWindow::OnFocusChanged(QWidget*, QWidget* now) {
@@ -243,6 +280,7 @@ void MainWindow::OnDockClosing(ViewDock* dock) {
   if (dock == m_active) m_active = nullptr;
   emit viewClosing(view);
   m_docks.erase(std::remove(m_docks.begin(), m_docks.end(), QPointer<ViewDock>(dock)), m_docks.end());
+  if (!m_closingAll) RefreshTitles();
 }
 
 void MainWindow::CloseAllViews() {
@@ -255,6 +293,7 @@ void MainWindow::CloseAllViews() {
   m_docks.clear();
   m_active = nullptr;
   m_closingAll = false;
+  m_activeTitle->setText({});
 }
 
 void MainWindow::ShowNotice(const QString& text) { statusBar()->showMessage(text, 15000); }

@@ -116,6 +116,15 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
         return false;
       }
       o.open.back().params[text.substr(0, eq)] = text.substr(eq + 1);
+    } else if (arg == "--style") {
+      std::string text;
+      if (!value(text)) return false;
+      if (text == "light" || text == "1") o.style = 1;
+      else if (text == "dark" || text == "2") o.style = 2;
+      else {
+        error = "--style: expected light or dark, got \"" + text + "\"";
+        return false;
+      }
     } else if (arg == "--snapshot") {
       if (!value(o.snapshotDir)) return false;
     } else if (arg == "--dump") {
@@ -124,6 +133,21 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
       if (!value(o.addonPath)) return false;
     } else if (arg == "--data-dir") {
       if (!value(o.dataDir)) return false;
+    } else if (arg == "--record") {
+      if (!value(o.recordFile)) return false;
+      if (o.recordFile.empty()) { error = "--record needs a file name"; return false; }
+    } else if (arg == "--replay") {
+      if (!value(o.replayFile)) return false;
+      if (o.replayFile.empty()) { error = "--replay needs a file name"; return false; }
+    } else if (arg == "--speed") {
+      std::string text;
+      if (!value(text)) return false;
+      double x = 0;
+      if (!ParseNumber(text, x) || !(x >= 0.1) || !(x <= 1000)) {
+        error = "--speed: expected a speed from 0.1 to 1000 (1 is real time), got \"" + text + "\"";
+        return false;
+      }
+      o.speed = x;
     } else if (arg == "--list-instruments") {
       // The count is optional: take the next word only when it is a number.
       if (hasInline) {
@@ -137,6 +161,14 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
       error = "unknown option \"" + std::string(argv[i]) + "\" (see --help)";
       return false;
     }
+  }
+  if (o.speed && o.replayFile.empty()) {
+    error = "--speed sets the speed of a replay; use it with --replay FILE";
+    return false;
+  }
+  if (!o.recordFile.empty() && o.recordFile == o.replayFile) {
+    error = "--record and --replay name the same file";
+    return false;
   }
   if ((!o.snapshotDir.empty() || !o.dumpDir.empty()) && !o.seconds && !o.headless) {
     // Snapshots and dumps are taken at the end of a timed run.
@@ -174,12 +206,23 @@ Options:
   --seed N                seed of the simulated market (same seed, same market)
   --instruments N         number of simulated instruments (1 to 500000)
   --rate N                simulated field updates per second
+  --style light|dark      the style of this session (the Display menu's choice is kept
+                          for the next; this one is not)
+  --record FILE           write the market the views receive (reference data and
+                          every value, with its market time) to FILE, compressed
+  --replay FILE           play a recording instead of the simulated market (a
+                          headless run lasts as long as the recording)
+  --speed X               replay speed, 0.1 to 1000 (default 1: as recorded)
   --snapshot DIR          at the end, write a PNG of the main window and of each view
-  --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv and
+  --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv,
                           the market's quotes of the shown instruments as
-                          DIR/market-quotes.tsv (the market stops first)
+                          DIR/market-quotes.tsv, the trade tape of each shown
+                          instrument as DIR/market-trades-<code>.tsv, and the
+                          volume by price of each trade summary's instrument as
+                          DIR/market-summary-<code>.tsv
   --list-instruments [N]  print the first N simulated instruments (all without N):
-                          product id, instrument code, exchange code, name
+                          product id, instrument code, exchange code, name;
+                          with --replay, the recording's instruments
   -v, --verbose           also print the views' log lines
   -h, --help              this text
 )";

@@ -27,12 +27,16 @@ struct Options {
   std::optional<std::uint64_t> seed;
   std::optional<int> instruments;
   std::optional<int> rate;          // field updates per second
+  std::optional<int> style;         // 1 light, 2 dark: this session only
   std::vector<OpenRequest> open;
   std::string snapshotDir;
   std::string dumpDir;
   std::optional<int> listInstruments;  // set: print the first N instruments and exit (0: all)
   std::string addonPath;
   std::string dataDir;
+  std::string recordFile;           // --record: write the market the views receive here
+  std::string replayFile;           // --replay: the market is this recording
+  std::optional<double> speed;      // --speed: replay speed (needs --replay)
 };
 
 // Parses argv. On a bad command line returns false with a one-line `error`.

@@ -10,9 +10,19 @@
 #include <QPushButton>
 #include <QVBoxLayout>
 
+#include "hostview/Services.h"
+#include "terminal/host/Services.h"
+
 namespace term {
 
-SettingsDialog::SettingsDialog(QWidget* parent) : QDialog(parent) {
+QString SettingsDialog::ColumnName(const ColumnSettingItem& item, const ILanguage* language) {
+  std::wstring text = language && item.textId > 0 ? language->GetText(13, item.textId) : std::wstring();
+  if (text.empty()) text = item.header;
+  if (text.empty() && language && item.textId > 0) text = language->GetText(kTerminalSection, item.textId);
+  return text.empty() ? QString::fromStdString(item.key) : QString::fromStdWString(text);
+}
+
+SettingsDialog::SettingsDialog(const ILanguage* language, QWidget* parent) : QDialog(parent) {
   setWindowTitle("Settings");
   CUserSettings& s = GetUserSettings();
   m_watchlist = s.GetWatchlistSetting();
@@ -25,8 +35,7 @@ SettingsDialog::SettingsDialog(QWidget* parent) : QDialog(parent) {
   const auto& layouts = m_watchlist.GetSetInfoList();
   if (!layouts.empty()) {
     for (const auto& item : layouts.front().items) {
-      auto* li = new QListWidgetItem(item.header.empty() ? QString::fromStdString(item.key)
-                                                         : QString::fromStdWString(item.header));
+      auto* li = new QListWidgetItem(ColumnName(item, language));
       li->setData(Qt::UserRole, QString::fromStdString(item.key));
       li->setFlags(li->flags() | Qt::ItemIsUserCheckable);
       li->setCheckState(item.visible ? Qt::Checked : Qt::Unchecked);

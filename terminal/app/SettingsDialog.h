@@ -6,6 +6,7 @@
 
 #include "hostconfig/UserSettings.h"
 
+class ILanguage;
 class QCheckBox;
 class QComboBox;
 class QListWidget;
@@ -15,8 +16,12 @@ namespace term {
 class SettingsDialog : public QDialog {
   Q_OBJECT
  public:
-  // Shows the current values of GetUserSettings().
-  explicit SettingsDialog(QWidget* parent = nullptr);
+  // Shows the current values of GetUserSettings(); column names come from
+  // `language` (the keys when there is none).
+  explicit SettingsDialog(const ILanguage* language, QWidget* parent = nullptr);
+  // The name a person reads for a quote column: its heading, else the
+  // terminal's name for a column whose heading is blank, else its key.
+  static QString ColumnName(const ColumnSettingItem& item, const ILanguage* language);
   // Writes the dialog's values into `settings` (each group stored at once).
   // False with `problem` when the storage refused a group (the values still apply).
   bool Apply(CUserSettings& settings, std::string& problem) const;

@@ -4,7 +4,9 @@
 #include <QDir>
 #include <QFile>
 #include <QInputDialog>
+#include <QPalette>
 #include <QPixmap>
+#include <QStatusBar>
 #include <QTextStream>
 #include <cstdio>
 #include <filesystem>
@@ -12,16 +14,26 @@
 
 #include "hostconfig/UserSettings.h"
 #include "hostview/MessageIds.h"
+#include "hostview/StyleRoles.h"
 #include "hostview/Text.h"
 #include "platform/Platform.h"
 #include "terminal/app/AddonLoader.h"
 #include "terminal/app/GridDump.h"
+#include "terminal/app/MarketSummaryDump.h"
+#include "terminal/app/MarketDump.h"
 #include "terminal/host/MarketQuotes.h"
 #include "terminal/app/MainWindow.h"
+#include "terminal/app/MarketFiles.h"
+#include "terminal/app/PlaybackBar.h"
 #include "terminal/app/SettingsDialog.h"
+#include "terminal/app/TerminalStyle.h"
+#include "terminal/host/Services.h"
+#include "terminal/host/MarketSource.h"
+#include "terminal/host/ReplaySource.h"
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteHostStore.h"
 #include "terminal/store/Store.h"
+#include "terminal/views/Blotter.h"
 #include "terminal/views/TerminalView.h"
 
 namespace term {
@@ -34,8 +46,10 @@ const QStringList kAddonClasses = {"CPriceViewAdv",   "CMarketDepthAdv",   "CTim
                                    "CTradeSummaryAdv", "CPriceAlertList",  "CNewPriceAlertAdv"};
 constexpr int kPumpMs = 50;
 constexpr double kDefaultHeadlessSeconds = 10;
-// After the market stops: long enough for every view's refresh timer to fire.
-constexpr std::uint32_t kFinalRefreshMs = 1000;
+// At the end of a timed run the views catch up with a market that stands
+// still, so that their dumps and the market's describe the same moment: long
+// enough for a page count noticed once a second to be asked for and drawn.
+constexpr int kSettleMs = 1500;
 constexpr int kAutosaveMs = 60 * 1000;
 
 StartParamMap Widen(const std::map<std::string, std::string>& in) {
@@ -70,10 +84,26 @@ TerminalApp::TerminalApp(const Options& options, AddonLoader& addon, Store* stor
 
 TerminalApp::~TerminalApp() {
   Shutdown();
+  views::SetLinkHandler(nullptr);
+  views::SetBlotter(nullptr);
   views::SetRuntime(nullptr);
 }
 
 void TerminalApp::Progress(const std::string& line) const { std::fprintf(stderr, "terminal: %s\n", line.c_str()); }
+
+std::vector<MainWindow::ViewClass> TerminalApp::ViewClasses(bool addon) const {
+  QStringList classes;
+  if (addon) {
+    for (const QString& c : kAddonClasses)
+      if (m_addon.Find(c.toStdString())) classes << c;
+  } else {
+    classes = views::ClassNames();
+  }
+  std::vector<MainWindow::ViewClass> out;
+  for (const QString& c : classes)
+    out.push_back({c, QString::fromStdWString(ViewName(&m_runtime->Language(), c.toStdString()))});
+  return out;
+}
 
 const CRuntimeClass* TerminalApp::FindClass(const std::string& className) const {
   if (const CRuntimeClass* rc = m_addon.Find(className)) return rc;
@@ -98,14 +128,41 @@ bool TerminalApp::Start(std::string& error) {
     m_hostStore = std::make_unique<SqliteHostStore>(
         *m_store, [this](const std::string& e) { Progress("error: " + e); });
   }
+  if (m_options.style) ho.styleId = *m_options.style;
   m_styleId = ho.styleId;
+  std::vector<std::string> marketWarnings;
+  if (!PrepareMarketFiles(m_options, ho, marketWarnings, error)) return false;
+  for (const std::string& w : marketWarnings) Progress("warning: " + w);
+  m_recordFile = m_options.recordFile;
+  m_replaySeconds = ReplaySeconds(ho);
   m_runtime = std::make_unique<HostRuntime>(ho, this, m_hostStore.get());
   views::SetRuntime(m_runtime.get());
+  m_log = m_runtime->LogFactory().CreateLogger();
+  m_blotter = std::make_unique<views::Blotter>(m_store, m_runtime->Market().DateText());
+  views::SetBlotter(m_blotter.get());
+  views::SetLinkHandler([this](std::int64_t productId, const std::string& code, CSuperBaseView* from) {
+    LinkInstrument(productId, code, from);
+  });
 
-  QStringList addonClasses;
-  for (const QString& c : kAddonClasses)
-    if (m_addon.Find(c.toStdString())) addonClasses << c;
-  m_window = std::make_unique<MainWindow>(addonClasses, views::ClassNames(),
+  // Instruments named on the command line must exist: a timed run stops
+  // before it starts, a window opens the view without one and says why.
+  std::vector<std::string> unknownInstruments(m_options.open.size());
+  for (std::size_t k = 0; k < m_options.open.size(); ++k) {
+    const OpenRequest& o = m_options.open[k];
+    if (o.productId < 0 || m_runtime->Source().Find(o.productId, o.instrumentCode) >= 0) continue;
+    unknownInstruments[k] = "unknown instrument " + std::to_string(o.productId) + ":" + o.instrumentCode +
+                            " in --open " + o.className + ":" + std::to_string(o.productId) + ":" +
+                            o.instrumentCode + " (--list-instruments lists the instruments)";
+    if (timed()) {
+      error = unknownInstruments[k];
+      m_startExitCode = 2;
+      return false;
+    }
+  }
+  if (!qobject_cast<TerminalStyle*>(QApplication::style())) QApplication::setStyle(new TerminalStyle);
+  ApplyStyleToApplication();
+
+  m_window = std::make_unique<MainWindow>(ViewClasses(true), ViewClasses(false),
                                           std::vector<MainWindow::Style>{{1, "&Light style"}, {2, "&Dark style"}},
                                           m_styleId);
   MainWindow* w = m_window.get();
@@ -118,6 +175,9 @@ bool TerminalApp::Start(std::string& error) {
     CWatchlistSetting watchlist = GetUserSettings().GetWatchlistSetting();
     watchlist.RefreshLanguage(&m_runtime->Language());
     if (!(watchlist == GetUserSettings().GetWatchlistSetting())) GetUserSettings().SetWatchlistSetting(watchlist);
+    std::vector<MainWindow::ViewClass> all = ViewClasses(true);
+    for (auto& c : ViewClasses(false)) all.push_back(c);
+    m_window->SetClassNames(all);
     m_runtime->ApplyLanguage();
   });
   connect(w, &MainWindow::fontSizeRequested, this, &TerminalApp::ShowFontSize);
@@ -127,27 +187,39 @@ bool TerminalApp::Start(std::string& error) {
   });
   connect(w, &MainWindow::dropRequested, this, &TerminalApp::OnDrop);
   connect(w, &MainWindow::closingWindow, this, [this] { Shutdown(); });
+  if (ReplaySource* replay = m_runtime->Replay()) {
+    m_playback = new PlaybackBar(*replay, w);
+    w->addToolBar(Qt::TopToolBarArea, m_playback);
+    w->statusBar()->addPermanentWidget(m_playback->StatusLabel());
+    connect(m_playback, &PlaybackBar::notice, w, &MainWindow::ShowNotice);
+  }
+  for (const std::string& warning : marketWarnings) w->ShowNotice(QString::fromStdString(warning));
 
   int restored = 0;
   if (m_options.restoreLayout) restored = RestoreLayout();
-  for (const auto& o : m_options.open) {
+  for (std::size_t k = 0; k < m_options.open.size(); ++k) {
+    const OpenRequest& o = m_options.open[k];
+    const bool known = o.productId >= 0 && unknownInstruments[k].empty();
     StartParamMap params;
-    if (o.productId >= 0) {
+    if (known) {
       params["User_field_product_id"] = std::to_wstring(o.productId);
       params["User_field_save_space"] = L"0";
     }
     for (const auto& [key, value] : o.params) params[key] = hv::Widen(value);
-    CSuperBaseView* v = OpenView(o.className, o.productId, o.instrumentCode, params, {}, error);
+    CSuperBaseView* v = OpenView(o.className, known ? o.productId : -1, known ? o.instrumentCode : std::string(),
+                                 params, {}, error);
     if (!v) return false;
     // Start parameters reach the view as a restored layout's do.
     if (!o.params.empty()) m_runtime->DeliverStartLink(v);
-    if (o.productId >= 0) DeliverLink(v, o.productId, o.instrumentCode);
+    if (known) DeliverLink(v, o.productId, o.instrumentCode);
+    if (!unknownInstruments[k].empty()) ReportProblem(QString::fromStdString("The " + unknownInstruments[k]) +
+                                                          ". The view opened without an instrument.", true);
   }
   if (restored == 0 && m_options.open.empty()) OpenDefaultLayout();
 
-  if (!m_options.seconds && !m_options.headless) {
+  if (!timed()) {
     // Real time: move the market along with the monotonic clock.
-    connect(&m_pump, &QTimer::timeout, this, [this] { m_runtime->PumpNow(); });
+    connect(&m_pump, &QTimer::timeout, this, [this] { Pump(platform::TickCount()); });
     m_pump.start(kPumpMs);
     // The layout is also saved now and then, so a crash or a kill loses little of it.
     connect(&m_autosave, &QTimer::timeout, this, [this] { SaveLayout(); });
@@ -157,13 +229,26 @@ bool TerminalApp::Start(std::string& error) {
   return true;
 }
 
+void TerminalApp::Pump(std::uint32_t now) {
+  m_runtime->Pump(now);
+  if (m_blotter) m_blotter->CheckFills(m_runtime->Market());
+  if (m_playback) m_playback->Refresh();
+}
+
 void TerminalApp::OpenDefaultLayout() {
-  // A first start: the price view and, on the first instrument, its depth and trades.
+  // A first start: the price view and, on the busiest stock, its depth and trades.
   std::string error;
   OpenView("CPriceViewAdv", -1, {}, {}, {}, error);
-  const auto& instruments = m_runtime->Market().Instruments();
-  if (!instruments.empty()) {
-    const auto& first = instruments.front();
+  // The busiest stock of the simulator, or of the recording when it has not that one.
+  const MarketSource& market = m_runtime->Source();
+  int stock = -1;
+  if (const int liquid = m_runtime->Market().LiquidStock(); liquid >= 0) {
+    const auto& ins = m_runtime->Market().Instruments()[static_cast<std::size_t>(liquid)];
+    stock = market.Find(ins.productId, ins.instrumentCode);
+  }
+  if (stock < 0 && !market.Instruments().empty()) stock = 0;
+  if (stock >= 0) {
+    const auto& first = market.Instruments()[static_cast<std::size_t>(stock)];
     for (const char* cls : {"CMarketDepthAdv", "CTimeAndSalesAdv"}) {
       StartParamMap params{{"User_field_product_id", std::to_wstring(first.productId)},
                            {"User_field_save_space", L"0"}};
@@ -195,8 +280,8 @@ CSuperBaseView* TerminalApp::OpenView(const std::string& className, std::int64_t
 
 void TerminalApp::DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code) {
   std::string exchange;
-  const int index = m_runtime->Market().Find(productId, code);
-  if (index >= 0) exchange = m_runtime->Market().Instruments()[static_cast<std::size_t>(index)].exchangeCode;
+  const int index = m_runtime->Source().Find(productId, code);
+  if (index >= 0) exchange = m_runtime->Source().Instruments()[static_cast<std::size_t>(index)].exchangeCode;
   const std::string narrow = "{\"type\":\"instrument view\",\"data\":[{\"Field_product_id\":\"" +
                              std::to_string(productId) + "\",\"Field_instrument_code\":\"" + JsonEscape(code) +
                              "\",\"Field_exchange_code\":\"" + JsonEscape(exchange) + "\"}]}";
@@ -205,6 +290,21 @@ void TerminalApp::DeliverLink(CSuperBaseView* view, std::int64_t productId, cons
   vl.className = hv::Widen(m_runtime->ClassNameOf(view));
   vl.link = &link;
   view->OnHostMessage(hm::LinkData, ToLParam(&vl));
+}
+
+void TerminalApp::LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from) {
+  // The add-on's single-instrument views decide themselves whether they follow.
+  m_runtime->LinkInstrument(productId, code);
+  // The terminal's chart, analytics and news follow.
+  const std::wstring text = hv::Widen("{\"type\":\"instrument view\",\"data\":[{\"Field_product_id\":\"" +
+                                      std::to_string(productId) + "\",\"Field_instrument_code\":\"" +
+                                      JsonEscape(code) + "\"}]}");
+  for (ViewDock* d : m_window->Docks()) {
+    CSuperBaseView* v = d->View();
+    const QString cls = d->ClassName();
+    if (v != from && (cls == "CBranticChartView" || cls == "CStockAnalytics" || cls == "CFNews"))
+      v->OnHostMessage(hm::LinkedInstrument, ToLParam(&text));
+  }
 }
 
 void TerminalApp::OnActivation(CSuperBaseView* view, bool active) {
@@ -237,7 +337,58 @@ void TerminalApp::OnDrop(CSuperBaseView* target, const QString& source, const QS
 void TerminalApp::ChangeStyle(int styleId) {
   m_styleId = styleId;
   m_runtime->ChangeStyle(styleId);
+  ApplyStyleToApplication();
   if (m_store) m_store->SaveSetting("ui.style", std::to_string(styleId));
+}
+
+void TerminalApp::ApplyStyleToApplication() {
+  // The views colour themselves from the style manager; everything else the
+  // terminal shows (menus, dock titles and tabs, the status bar, the empty
+  // parts of the window, dialogs) takes the same colours from this palette.
+  const IStyleManager& st = m_runtime->Styles();
+  using namespace hv::style;
+  const QColor face = st.Color(kFace), text = st.Color(kText), base = st.Color(kWindow),
+               muted = st.Color(kMutedText), border = st.Color(kBorder);
+  const bool dark = face.lightness() < 128;
+  QPalette pal;
+  for (QPalette::ColorGroup g : {QPalette::Active, QPalette::Inactive, QPalette::Disabled}) {
+    const bool off = g == QPalette::Disabled;
+    pal.setColor(g, QPalette::Window, face);
+    pal.setColor(g, QPalette::WindowText, off ? muted : text);
+    pal.setColor(g, QPalette::Base, off ? face : base);
+    pal.setColor(g, QPalette::AlternateBase, st.Color(107));
+    pal.setColor(g, QPalette::Text, off ? muted : text);
+    pal.setColor(g, QPalette::Button, face);
+    pal.setColor(g, QPalette::ButtonText, off ? muted : text);
+    pal.setColor(g, QPalette::BrightText, dark ? QColor(Qt::white) : QColor(Qt::black));
+    pal.setColor(g, QPalette::Highlight, st.Color(kSelection));
+    pal.setColor(g, QPalette::HighlightedText, st.Color(kSelectionText));
+    pal.setColor(g, QPalette::ToolTipBase, face);
+    pal.setColor(g, QPalette::ToolTipText, text);
+    pal.setColor(g, QPalette::PlaceholderText, muted);
+    pal.setColor(g, QPalette::Link, st.Color(kLinkText));
+    pal.setColor(g, QPalette::LinkVisited, st.Color(kLinkText));
+    pal.setColor(g, QPalette::Light, dark ? face.lighter(130) : QColor(Qt::white));
+    pal.setColor(g, QPalette::Midlight, dark ? face.lighter(115) : face.lighter(105));
+    pal.setColor(g, QPalette::Mid, border);
+    pal.setColor(g, QPalette::Dark, dark ? face.darker(140) : border.darker(115));
+    pal.setColor(g, QPalette::Shadow, dark ? QColor(0, 0, 0) : border.darker(160));
+  }
+  QApplication::setPalette(pal);
+}
+
+void TerminalApp::ReportProblem(const QString& text, bool dialog) {
+  const std::string line = text.toStdString();
+  if (m_log) m_log->Log(4, "%s", line.c_str());
+  Progress("warning: " + line);
+  if (!m_window) return;
+  m_window->ShowNotice(text);
+  if (!dialog || timed()) return;
+  // After the window is up, so that the box has it as its parent.
+  QTimer::singleShot(0, m_window.get(), [this, text] {
+    platform::Dialogs().MessageBox(m_window.get(), m_window->windowTitle(), text, platform::Icon::Warning,
+                                   platform::Buttons::Ok);
+  });
 }
 
 void TerminalApp::ShowFontSize() {
@@ -254,7 +405,7 @@ void TerminalApp::ShowFontSize() {
 }
 
 void TerminalApp::ShowSettings() {
-  SettingsDialog dialog(m_window.get());
+  SettingsDialog dialog(&m_runtime->Language(), m_window.get());
   if (dialog.exec() != QDialog::Accepted) return;
   std::string problem;
   if (!dialog.Apply(GetUserSettings(), problem)) m_window->ShowNotice(QString::fromStdString(problem));
@@ -299,7 +450,8 @@ int TerminalApp::RestoreLayout() {
                                  QString::fromStdString(sv.objectName), error);
     if (!v) {
       // A view the add-on no longer offers: the rest of the layout still comes back.
-      Progress("warning: saved view " + sv.className + " not restored: " + error);
+      ReportProblem(QString::fromStdString("The saved view " + sv.className + " was not restored: " + error + "."),
+                    false);
       continue;
     }
     opened.push_back(v);
@@ -319,34 +471,50 @@ int TerminalApp::RestoreLayout() {
 
 // ---- Timed runs ---------------------------------------------------------------
 
+bool TerminalApp::FinishRecording() {
+  if (m_recordFile.empty()) return true;
+  std::string error;
+  const bool ok = m_runtime->FinishRecording(&error);
+  if (!ok) Progress("error: " + error);
+  else Progress("recorded the market to " + m_recordFile);
+  m_recordFile.clear();
+  return ok;
+}
+
 int TerminalApp::RunTimed() {
-  const double seconds = m_options.seconds.value_or(kDefaultHeadlessSeconds);
+  // A replay runs to the end of its recording unless told otherwise.
+  const double seconds =
+      m_options.seconds.value_or(m_runtime->Replay() ? m_replaySeconds : kDefaultHeadlessSeconds);
   auto& clock = platform::UseVirtualClock();
   const auto steps = static_cast<long long>(seconds * 1000.0 / kPumpMs + 0.5);
-  Progress("running " + QString::number(seconds).toStdString() + " simulated seconds with " +
+  const ReplaySource* replay = m_runtime->Replay();
+  Progress((replay ? "replaying " + replay->Path() + " (" + replay->Session().date + ") for " : std::string("running ")) +
+           QString::number(seconds).toStdString() + " simulated seconds with " +
            std::to_string(m_window->Docks().size()) + " views");
   for (long long i = 0; i < steps && !m_shutDown && !m_stopRequested; ++i) {
     clock.Advance(kPumpMs);
-    m_runtime->Pump(clock.Now());
+    Pump(clock.Now());
     platform::ProcessPosted();
     QCoreApplication::processEvents();
   }
-  // The market stops here; every view refreshes once more from what it was
-  // sent, so that the dumps and the market's files describe one moment.
-  clock.Advance(kFinalRefreshMs);
-  platform::ProcessPosted();
-  QCoreApplication::processEvents();
+  SettleViews();
   int code = 0;
+  if (!FinishRecording()) code = 1;
   if (!SaveLayout()) code = 1;
   std::string error;
   if (!m_options.dumpDir.empty()) {
     const int n = DumpGrids(m_options.dumpDir, error);
     if (n < 0) { Progress("error: " + error); code = 1; }
     else Progress("wrote " + std::to_string(n) + (n == 1 ? " grid dump to " : " grid dumps to ") + m_options.dumpDir);
-    const std::string quotes = (fs::path(m_options.dumpDir) / "market-quotes.tsv").string();
-    if (!WriteMarketQuotes(quotes, m_runtime->Market(), m_runtime->QuoteInstruments(), error)) {
-      Progress("error: " + error);
-      code = 1;
+    // The market files are the simulator's: in a replay they are not the market played.
+    if (!m_runtime->Replay()) {
+      if (WriteMarketTradeDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
+      if (WriteMarketSummaryDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
+      const std::string quotes = (fs::path(m_options.dumpDir) / "market-quotes.tsv").string();
+      if (!WriteMarketQuotes(quotes, m_runtime->Market(), m_runtime->QuoteInstruments(), error)) {
+        Progress("error: " + error);
+        code = 1;
+      }
     }
   }
   if (!m_options.snapshotDir.empty()) {
@@ -356,6 +524,17 @@ int TerminalApp::RunTimed() {
   }
   Shutdown();
   return code;
+}
+
+void TerminalApp::SettleViews() {
+  auto& clock = platform::UseVirtualClock();
+  const std::uint32_t marketTick = clock.Now();
+  for (int waited = 0; waited < kSettleMs && !m_shutDown && !m_stopRequested; waited += kPumpMs) {
+    clock.Advance(kPumpMs);
+    m_runtime->Pump(marketTick);  // answers and pushes, but no market step
+    platform::ProcessPosted();
+    QCoreApplication::processEvents();
+  }
 }
 
 int TerminalApp::DumpGrids(const std::string& dir, std::string& error) {
@@ -416,7 +595,7 @@ void TerminalApp::RequestStop() {
   if (m_stopRequested) return;
   m_stopRequested = true;
   Progress("stopping");
-  if (!m_options.seconds && !m_options.headless) QCoreApplication::quit();
+  if (!timed()) QCoreApplication::quit();
 }
 
 void TerminalApp::Shutdown() {
@@ -424,7 +603,8 @@ void TerminalApp::Shutdown() {
   m_shutDown = true;
   m_pump.stop();
   m_autosave.stop();
-  if (!m_options.seconds && !m_options.headless) SaveLayout();
+  if (!timed()) SaveLayout();
+  FinishRecording();
   m_window->CloseAllViews();
 }
 
@@ -447,8 +627,11 @@ CSuperBaseView* TerminalApp::OpenView(const std::wstring& className, CSuperBaseV
   return v;
 }
 
-void TerminalApp::ForeignLink(const std::wstring& className, const std::wstring& linkText, CSuperBaseView*) {
-  m_window->ShowNotice(QString("No view of class %1 in this terminal.").arg(QString::fromStdWString(className)));
+void TerminalApp::ForeignLink(const std::wstring& className, const std::wstring& linkText, CSuperBaseView* requester) {
+  const QString from = requester ? m_window->NameOf(QString::fromStdString(m_runtime->ClassNameOf(requester))) : QString();
+  ReportProblem(QString("%1 asked for a view of class %2, which this terminal does not have.")
+                    .arg(from.isEmpty() ? QString("A view") : from, QString::fromStdWString(className)),
+                false);
 }
 
 void TerminalApp::ShowNotice(const std::wstring& title, const std::wstring& text) {

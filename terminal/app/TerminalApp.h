@@ -8,6 +8,7 @@
 #include <memory>
 #include <string>
 
+#include "terminal/app/MainWindow.h"
 #include "terminal/app/Options.h"
 #include "terminal/host/HostRuntime.h"
 
@@ -18,6 +19,10 @@ namespace term {
 
 class AddonLoader;
 class MainWindow;
+class PlaybackBar;
+namespace views {
+class Blotter;
+}
 class SqliteHostStore;
 class Store;
 class ViewDock;
@@ -30,10 +35,22 @@ class TerminalApp : public QObject, public IHostShell {
   ~TerminalApp() override;
 
   // Builds the runtime and the window, restores the layout and opens --open.
+  // False with `error` when the terminal cannot run; StartExitCode() says how
+  // to end (2: the command line named something that does not exist).
   bool Start(std::string& error);
+  int StartExitCode() const { return m_startExitCode; }
+  // A problem the user must hear of without the terminal stopping: a line in
+  // the log and on standard error, the status bar, and with `dialog` (and a
+  // window to show it in) a message box.
+  void ReportProblem(const QString& text, bool dialog);
   // Headless or --seconds: runs the simulated seconds, writes dumps and
   // snapshots, saves. Returns the process exit code.
   int RunTimed();
+  // Moves the market to `now`, delivers what changed and fills working orders.
+  void Pump(std::uint32_t now);
+  // Shows an instrument in the linked views: the add-on's single-instrument
+  // views (615) and the terminal's chart, analytics and news (not `from`).
+  void LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from);
   // Saves the layout and closes every view (idempotent).
   void Shutdown();
   // Ends a timed run early (after the current step) or the event loop (SIGINT, SIGTERM).
@@ -54,6 +71,9 @@ class TerminalApp : public QObject, public IHostShell {
 
   // Writes <dir>/<Class>-<n>.tsv for every view; returns the number of files.
   int DumpGrids(const std::string& dir, std::string& error);
+  // Runs the views' timers for a moment with the market standing still, so
+  // that what they show has caught up with it.
+  void SettleViews();
   // Writes <dir>/terminal.png and <dir>/<Class>-<n>.png; returns the number of files.
   int Snapshot(const std::string& dir, std::string& error);
 
@@ -71,21 +91,35 @@ class TerminalApp : public QObject, public IHostShell {
   void ShowSettings();
   void ShowFontSize();
   void ChangeStyle(int styleId);
+  // The whole application (menus, docks, status bar, dialogs) in the style's colours.
+  void ApplyStyleToApplication();
   void Progress(const std::string& line) const;
+  // Headless or --seconds: the virtual clock, nobody at the window.
+  bool timed() const { return m_options.headless || m_options.seconds.has_value(); }
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
+  // Ends the recording, if any, and says how it went. False when it failed.
+  bool FinishRecording();
+  // The add-on's (or the terminal's own) classes with their names for a person.
+  std::vector<MainWindow::ViewClass> ViewClasses(bool addon) const;
 
   Options m_options;
   AddonLoader& m_addon;
   Store* m_store;
   std::unique_ptr<SqliteHostStore> m_hostStore;
   std::unique_ptr<HostRuntime> m_runtime;
+  std::unique_ptr<views::Blotter> m_blotter;
   std::unique_ptr<MainWindow> m_window;
+  PlaybackBar* m_playback = nullptr;  // owned by the window; replays only
+  std::string m_recordFile;
+  double m_replaySeconds = 0;
   QTimer m_pump;
   QTimer m_autosave;
   bool m_shutDown = false;
   bool m_stopRequested = false;
   int m_styleId = 1;
+  int m_startExitCode = 1;
+  ILogger* m_log = nullptr;
 };
 
 }  // namespace term

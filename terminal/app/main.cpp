@@ -15,6 +15,8 @@
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/Options.h"
 #include "terminal/app/TerminalApp.h"
+#include "terminal/host/MarketRecording.h"
+#include "terminal/host/Services.h"
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteSettingsStorage.h"
 #include "terminal/store/Store.h"
@@ -27,13 +29,21 @@ int Fail(const std::string& message, int code = 1) {
   return code;
 }
 
-// Prints product id, instrument code, exchange code and name, tab-separated.
+// Prints product id, instrument code, exchange code and name, tab-separated:
+// the simulated market's instruments, or a recording's with --replay.
 int ListInstruments(const term::Options& o) {
-  sim::MarketConfig config;
-  if (o.seed) config.seed = *o.seed;
-  if (o.instruments) config.instruments = *o.instruments;
-  sim::Market market(config);
-  const auto& all = market.Instruments();
+  std::vector<JInstrumentUnderlying> all;
+  if (!o.replayFile.empty()) {
+    term::rec::Reader reader;
+    std::string error;
+    if (!reader.Open(o.replayFile, error)) return Fail(error);
+    all = reader.Ref().instruments;
+  } else {
+    sim::MarketConfig config;
+    if (o.seed) config.seed = *o.seed;
+    if (o.instruments) config.instruments = *o.instruments;
+    all = sim::Market(config).Instruments();
+  }
   const std::size_t n = *o.listInstruments == 0 ? all.size()
                                                 : std::min(all.size(), static_cast<std::size_t>(*o.listInstruments));
   std::string out;
@@ -99,12 +109,33 @@ int main(int argc, char** argv) {
   }
   if (!options.verbose) qInstallMessageHandler(QuietQtMessages);
 
-  QApplication app(argc, argv);
+  // Qt sees only the program name: the options are the terminal's (Qt would
+  // take "--style" for its own).
+  int qtArgc = 1;
+  QApplication app(qtArgc, argv);
   QApplication::setApplicationName("marketviews-terminal");
+
+  const std::filesystem::path dataDir =
+      options.dataDir.empty() ? term::Store::DefaultDataDir() : std::filesystem::path(options.dataDir);
+  // Before the terminal runs, a refusal goes to standard error, the log and,
+  // with a window system, a message box: a terminal started from a desktop
+  // has nobody reading its standard error.
+  auto refuse = [&](const std::string& message, int code) {
+    Fail(message, code);
+    {
+      term::LogFactory log((dataDir / "logs" / "terminal.log").string(), false);
+      log.Error(message);
+    }
+    if (!timed)
+      platform::Dialogs().MessageBox(nullptr, QStringLiteral("Brantic Terminal"),
+                                     QString::fromStdString("The terminal cannot start: " + message + "."),
+                                     platform::Icon::Error, platform::Buttons::Ok);
+    return code;
+  };
 
   term::AddonLoader addon;
   const std::string addonPath = options.addonPath.empty() ? term::AddonLoader::DefaultPath() : options.addonPath;
-  if (!addon.Load(addonPath, error)) return Fail(error);
+  if (!addon.Load(addonPath, error)) return refuse(error, 1);
 
   for (const auto& o : options.open) {
     if (addon.Find(o.className) || term::views::FindClass(o.className)) continue;
@@ -113,15 +144,12 @@ int main(int argc, char** argv) {
                           "CPriceAlertList", "CNewPriceAlertAdv"})
       if (addon.Find(c)) known += std::string(" ") + c;
     for (const QString& c : term::views::ClassNames()) known += " " + c.toStdString();
-    return Fail("unknown view class \"" + o.className + "\" in --open; known classes:" + known, 2);
+    return refuse("unknown view class \"" + o.className + "\" in --open; known classes:" + known, 2);
   }
 
-  const std::filesystem::path dataDir =
-      options.dataDir.empty() ? term::Store::DefaultDataDir() : std::filesystem::path(options.dataDir);
   term::StoreOpenReport report;
   auto store = term::Store::Open(dataDir, report, error);
-  if (!store) return Fail(error);
-  if (!report.message.empty()) std::fprintf(stderr, "terminal: warning: %s\n", report.message.c_str());
+  if (!store) return refuse(error, 1);
   if (!GetUserSettings().SetStorage(std::make_shared<term::SqliteSettingsStorage>(*store)))
     std::fprintf(stderr, "terminal: warning: some settings could not be read and keep their defaults: %s\n",
                  GetUserSettings().GetErrorInfo().c_str());
@@ -145,8 +173,12 @@ int main(int argc, char** argv) {
       sigaction(SIGINT, &sa, nullptr);
       sigaction(SIGTERM, &sa, nullptr);
     }
-    if (!terminal.Start(error)) return Fail(error);
-    if (!report.message.empty()) terminal.Window().ShowNotice(QString::fromStdString(report.message));
+    if (!terminal.Start(error)) {
+      terminal.Shutdown();
+      GetUserSettings().SetStorage(nullptr);
+      return refuse(error, terminal.StartExitCode());
+    }
+    if (!report.message.empty()) terminal.ReportProblem(QString::fromStdString(report.message), true);
     code = timed ? terminal.RunTimed() : app.exec();
     terminal.Shutdown();
   }

@@ -3,7 +3,7 @@
 // numbered requests (synchronously where they need an answer), keeps their
 // field subscriptions and pushes value changes, stores watchlists and alerts,
 // and relays notifications between views. The market behind it is the
-// simulated one (terminal/sim).
+// simulated one (terminal/sim) or a replayed recording.
 //
 // Threading: everything runs on the UI thread. A view may re-enter the runtime
 // from inside OnHostMessage (a synchronous answer that triggers another
@@ -13,6 +13,10 @@
 // tick `now` (platform::TickCount() in the application, the virtual clock in
 // tests) and pushes what changed since the previous Pump, one 410 per
 // subscription and field at most.
+//
+// Market: what the views receive (reference lists and field values) comes
+// from a MarketSource (terminal/host/MarketSource.h): the simulator, or a
+// recording being replayed; a recorder can sit in front of either.
 #include <cstdint>
 #include <functional>
 #include <map>
@@ -37,6 +41,12 @@ struct MarketConfig;
 namespace term {
 
 class HostSettings;
+class MarketSource;
+class ReplaySource;
+namespace rec {
+struct Summary;
+class Writer;
+}  // namespace rec
 
 // Implemented by the terminal application (main window, docks). Every call is
 // made from inside a view's request; the defaults do nothing, so a test shell
@@ -86,6 +96,13 @@ struct HostOptions {
   int styleId = 1;                      // 1 light, 2 dark
   int displayMode = 1;                  // answer to 519: 1 or 101
   int linkMode = 0;                     // 528 flag sent after activation
+  // Replay: the views receive this recording (checked with rec::Scan) instead
+  // of the simulated market, played at `replaySpeed`. The simulator then runs
+  // on the recording's seed and day for the terminal's own extras.
+  std::shared_ptr<const rec::Summary> replay;
+  double replaySpeed = 1.0;
+  // Record: what the views receive is also written here (opened, not begun).
+  std::shared_ptr<rec::Writer> record;
 };
 
 // Counters for tests, the benchmark and the status bar.
@@ -154,6 +171,15 @@ class HostRuntime : public IViewHost {
   // Changes a setting, saves it in the store and tells every view (2600).
   void SaveSetting(const std::string& key, const std::string& value);
   sim::Market& Market();
+  // The market the views receive: the simulator, or the replayed recording;
+  // with --record, the recorder in front of it.
+  MarketSource& Source();
+  // The replay's playback controls; null when the market is the simulator.
+  ReplaySource* Replay();
+  // Writes the recording's end line and closes it; later values are not
+  // recorded. False with `error` when the recording failed at any point.
+  // True (and nothing to do) without a recording.
+  bool FinishRecording(std::string* error = nullptr);
   // Text of a message code ("17001"); empty when unknown.
   std::wstring MessageText(const std::string& code) const;
   // Writes one line to the terminal's own log (info level).

@@ -31,6 +31,19 @@ struct StoredWatchlist {
   std::vector<StoredWatchItem> items;  // display order
 };
 
+// One firing of a price alert as the terminal told the user; kept with the
+// alert so that its history survives a restart.
+struct AlertFiring {
+  std::int32_t alertId = 0;
+  std::string firedAt;     // session time, "YYYY-MM-DD HH:MM:SS"
+  std::string priceField;  // "ASK", "BID", "LDONE" (as stored on the alert)
+  std::string comparator;  // "<=" or ">="
+  double threshold = 0.0;
+  double value = 0.0;      // the price that met the condition
+  std::string valueText;   // the same in the instrument's format
+  std::string notice;      // the notice shown and logged
+};
+
 class IHostStore {
  public:
   virtual ~IHostStore() = default;
@@ -45,6 +58,11 @@ class IHostStore {
   // Replaces every stored alert by `alerts`.
   virtual void SaveAlerts(const std::vector<PriceAlertItem>& alerts) = 0;
 
+  // Appends one firing to the alert's history. Default: not kept.
+  virtual void SaveAlertFiring(const AlertFiring& firing) {}
+  // The history of one alert, oldest first.
+  virtual std::vector<AlertFiring> LoadAlertFirings(std::int32_t alertId) { return {}; }
+
   // Setting overrides by key ("MAXWL", ...), applied over the config file.
   virtual std::map<std::string, std::string> LoadSettings() = 0;
   virtual void SaveSetting(const std::string& key, const std::string& value) = 0;
@@ -57,6 +75,8 @@ class MemoryHostStore : public IHostStore {
   void SaveWatchlists(StoredWatchlist::Kind kind, const std::vector<StoredWatchlist>& lists) override;
   bool LoadAlerts(std::vector<PriceAlertItem>& out) override;
   void SaveAlerts(const std::vector<PriceAlertItem>& alerts) override;
+  void SaveAlertFiring(const AlertFiring& firing) override;
+  std::vector<AlertFiring> LoadAlertFirings(std::int32_t alertId) override;
   std::map<std::string, std::string> LoadSettings() override;
   void SaveSetting(const std::string& key, const std::string& value) override;
 
@@ -65,6 +85,7 @@ class MemoryHostStore : public IHostStore {
   bool watchlistsSaved = false;
   std::vector<PriceAlertItem> alerts;
   bool alertsSaved = false;
+  std::vector<AlertFiring> firings;
   std::map<std::string, std::string> settings;
   int saveCount = 0;
 };

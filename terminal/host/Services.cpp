@@ -67,11 +67,36 @@ const Entry kSection13[] = {
     {735, L"Triggered"}, {736, L"Expired"},
 };
 const Entry kSection30[] = {{1, L"Small"}, {2, L"Medium"}, {3, L"Large"}, {4, L"Extra Large"}};
+const Entry kTerminalTexts[] = {
+    {1, L"Price View"}, {2, L"Trade Ticket"}, {3, L"Chart"}, {4, L"Instrument Explorer"}, {5, L"Stock Analytics"},
+    {6, L"News"},
+    // Quote columns whose heading is blank.
+    {112, L"Product icon"}, {113, L"Link"}, {124, L"Change arrow"},
+};
+// Which text names a view class: section and entry.
+struct ViewNameEntry { const char* className; int section; int entry; };
+const ViewNameEntry kViewNames[] = {
+    {"CPriceViewAdv", kTerminalSection, 1}, {"CMarketDepthAdv", 13, 7},      {"CTimeAndSalesAdv", 13, 8},
+    {"CTradeSummaryAdv", 13, 10},           {"CPriceAlertList", 13, 9},      {"CNewPriceAlertAdv", 13, 725},
+    {"CTradeView", kTerminalSection, 2},    {"CBranticChartView", kTerminalSection, 3},
+    {"CInsExpViewEx", kTerminalSection, 4}, {"CStockAnalytics", kTerminalSection, 5},
+    {"CFNews", kTerminalSection, 6},
+};
 }  // namespace
+
+std::wstring ViewName(const ILanguage* language, const std::string& className) {
+  for (const ViewNameEntry& v : kViewNames) {
+    if (className != v.className) continue;
+    std::wstring text = language ? language->GetText(v.section, v.entry) : std::wstring();
+    if (!text.empty()) return text;
+  }
+  return hv::Widen(className);
+}
 
 LanguageTable::LanguageTable() {
   for (const Entry& e : kSection13) texts_[{13, e.id}] = e.text;
   for (const Entry& e : kSection30) texts_[{30, e.id}] = e.text;
+  for (const Entry& e : kTerminalTexts) texts_[{kTerminalSection, e.id}] = e.text;
 }
 
 std::wstring LanguageTable::GetText(int section, int entry) const {
@@ -221,11 +246,11 @@ QFont StyleManager::GetFont(int id) const {
 
 std::vector<std::string> StyleManager::KnownImages() {
   return {
-      "images/Toolbar/[styleID]/InstrumentExplorer.bmp", "images/QuickBar/[styleID]/toList.bmp",
-      "images/QuickBar/[styleID]/tradeboard.bmp",        "images/QuickBar/[styleID]/CompanyInfo.bmp",
-      "images/QuickBar/[styleID]/toclose.bmp",           "images/Bitmaps/[styleID]/help.bmp",
-      "images/Products/ES.bmp",  "images/Products/CS.bmp", "images/Products/CFD.bmp",
-      "images/Products/FUT.bmp", "images/Products/FX.bmp", "images/Products/DMA.bmp",
+      "Toolbar/[styleID]/InstrumentExplorer.bmp", "QuickBar/[styleID]/toList.bmp",
+      "QuickBar/[styleID]/tradeboard.bmp",        "QuickBar/[styleID]/CompanyInfo.bmp",
+      "QuickBar/[styleID]/toclose.bmp",           "Bitmaps/[styleID]/help.bmp",
+      "Products/ES.bmp",  "Products/CS.bmp", "Products/CFD.bmp", "Products/FUT.bmp",
+      "Products/FX.bmp",  "Products/DMA.bmp", "Products/IDX.bmp",
   };
 }
 
@@ -235,6 +260,8 @@ std::wstring StyleManager::ResolveImagePath(const std::wstring& path, int styleI
   for (char& c : rel) if (c == '\\') c = '/';
   while (rel.rfind("./", 0) == 0) rel.erase(0, 2);
   while (!rel.empty() && rel.front() == '/') rel.erase(0, 1);
+  // The image folder is the terminal's "images" folder itself.
+  if (rel.rfind("images/", 0) == 0) rel.erase(0, 7);
   const std::string concrete = Replace(rel, "[styleID]", std::to_string(styleId));
   if (concrete.empty() || concrete.find("..") != std::string::npos) return {};
   const std::string file = imageDir_ + "/" + concrete;
@@ -307,7 +334,8 @@ bool StyleManager::Draw(const std::string& known, int styleId, const std::string
       // A coloured tag with the product type.
       const QColor tag = name == "CFD" ? QColor(200, 110, 20) : name == "FUT" ? QColor(120, 70, 170)
                          : name == "FX" ? QColor(20, 140, 140) : name == "DMA" ? QColor(170, 40, 80)
-                         : name == "CS" ? QColor(90, 110, 40) : QColor(30, 100, 200);
+                         : name == "CS" ? QColor(90, 110, 40) : name == "IDX" ? QColor(90, 96, 110)
+                         : QColor(30, 100, 200);
       g.setPen(Qt::NoPen);
       g.setBrush(tag);
       g.drawRoundedRect(QRectF(1, 2, w - 2, h - 4), 3, 3);

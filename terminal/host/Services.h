@@ -17,8 +17,12 @@ class logger;
 
 namespace term {
 
+// The terminal's own texts: view names (1..), names of the quote columns whose
+// heading is blank (by the heading's entry in section 13), and its messages.
+inline constexpr int kTerminalSection = 40;
+
 // English texts by section and entry. Section 13 holds every text the views
-// read; section 30 the font-size names.
+// read; section 30 the font-size names; kTerminalSection the terminal's own.
 class LanguageTable : public ILanguage {
  public:
   LanguageTable();
@@ -30,6 +34,11 @@ class LanguageTable : public ILanguage {
  private:
   std::map<std::pair<int, int>, std::wstring> texts_;
 };
+
+// The name a person reads for a view class ("Market Depth" for
+// "CMarketDepthAdv"), from the language table; the class name when the table
+// has none.
+std::wstring ViewName(const ILanguage* language, const std::string& className);
 
 // Message texts by five-digit code ("17001"). The lookup key of 2814 is
 // "%s, %I64d" (code and product id); products are named in some texts.
@@ -58,7 +67,8 @@ class StyleManager : public IStyleManager {
   void SetStyleID(int styleId);
   COLORREF GetColor(int colorId) const override;
   QFont GetFont(int fontId) const override;
-  // ".\images\Toolbar\[styleID]\InstrumentExplorer.bmp" -> "<imageDir>/images/Toolbar/1/InstrumentExplorer.bmp".
+  // ".\images\Toolbar\[styleID]\InstrumentExplorer.bmp" -> "<imageDir>/Toolbar/1/InstrumentExplorer.bmp"
+  // (`imageDir` is the terminal's "images" folder).
   // The image is drawn when it does not exist yet; empty for names the
   // terminal does not know.
   std::wstring ResolveImagePath(const std::wstring& path, int styleId) const override;

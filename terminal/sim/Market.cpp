@@ -2,8 +2,10 @@
 
 #include <algorithm>
 #include <array>
+#include <cctype>
 #include <cmath>
 #include <cstdio>
+#include <limits>
 #include <map>
 #include <numeric>
 #include <unordered_map>
@@ -82,14 +84,47 @@ std::string Clock(std::uint32_t ms) {
 // look sequential and no two instruments of an exchange share a code.
 std::uint64_t Scramble(std::uint64_t n, std::uint64_t space) { return (n * 7919 + 331) % space; }
 
-std::string LetterCode(std::uint64_t n) {
-  std::uint64_t space = 26 * 26 * 26;
-  int len = 3;
-  while (n >= space) { n -= space; space *= 26; ++len; }
-  std::uint64_t v = Scramble(n, space);
-  std::string s(len, 'A');
-  for (int i = len - 1; i >= 0; --i) { s[i] = char('A' + v % 26); v /= 26; }
-  return s;
+std::string Letters(const std::string& text) {
+  std::string out;
+  for (char c : text)
+    if (std::isalpha(static_cast<unsigned char>(c))) out.push_back(char(std::toupper(static_cast<unsigned char>(c))));
+  return out;
+}
+
+// A ticker made from a company's name ("Marwick Engineering" -> "MARW",
+// "MARE", "MRWC", ...): the first free one of a few readable shapes, then one
+// of them with letters added. `taken` holds every code already in use.
+std::string Ticker(const std::string& stem, const std::string& word, std::unordered_set<std::string>& taken) {
+  const std::string s = Letters(stem), w = Letters(word.substr(0, word.find(' ')));
+  std::string skeleton = s.substr(0, 1);
+  for (std::size_t k = 1; k < s.size(); ++k)
+    if (std::string("AEIOU").find(s[k]) == std::string::npos) skeleton.push_back(s[k]);
+  const std::string shapes[] = {s.substr(0, 4), s.substr(0, 3) + w.substr(0, 1), skeleton.substr(0, 4),
+                                s.substr(0, 2) + w.substr(0, 2), skeleton.substr(0, 3) + w.substr(0, 1),
+                                s.substr(0, 3)};
+  for (const std::string& t : shapes)
+    if (t.size() >= 3 && taken.insert(t).second) return t;
+  const std::string stemOf = s.substr(0, 3);
+  for (int len = 1; len <= 3; ++len) {
+    std::uint64_t space = 1;
+    for (int k = 0; k < len; ++k) space *= 26;
+    for (std::uint64_t v = 0; v < space; ++v) {
+      std::string t = stemOf;
+      for (std::uint64_t x = v, k = 0; k < std::uint64_t(len); ++k, x /= 26) t.push_back(char('A' + x % 26));
+      if (taken.insert(t).second) return t;
+    }
+  }
+  for (int k = 2;; ++k)  // not reached below 18,000 names per stem
+    if (taken.insert(stemOf + std::to_string(k)).second) return stemOf + std::to_string(k);
+}
+
+// Company names are unique; a repeated one becomes another company of the group.
+std::string UniqueName(const std::string& name, const std::string& code, std::unordered_set<std::string>& taken) {
+  for (const char* suffix : {"", " Holdings", " Group", " International", " Partners", " Corporation"})
+    if (taken.insert(name + suffix).second) return name + suffix;
+  const std::string fallback = name + " (" + code + ")";
+  taken.insert(fallback);
+  return fallback;
 }
 
 // Letter, digit, letter-or-digit: never all letters, so never another
@@ -155,7 +190,7 @@ const ExchangeDef kExchanges[] = {
     {"SGXDT", "SGX-DT", "SGX Derivatives Trading", 104, 0, 9, 0, 0, 0, "USD", 0},
     {"HKFE", "HKFE", "Hong Kong Futures Exchange", 104, 15, 9, 0, 0, 0, "HKD", 0},
     {"FXM", "FX", "Foreign Exchange Market", 105, 0, 6, 4, 0, 0, "USD", 0},
-    {"WIDX", "World Indices", "World Indices", 101, 15, 8, 2, 0, 0, "", 0},
+    {"WIDX", "World Indices", "World Indices", 107, 15, 8, 2, 0, 0, "", 0},
 };
 constexpr int kEquityExchanges = 7;
 
@@ -212,6 +247,7 @@ struct InstInfo {
   std::int16_t year = 0;
   std::int8_t cfd = 0, dma = 0;
   bool equity = false;     // ranked in the TOP30 lists
+  bool index = false;      // a computed value: ticks, no book
   std::uint8_t exchange = 0;
 };
 
@@ -249,6 +285,8 @@ struct Market::Impl {
   int interestTotal = 0;
   std::vector<std::uint8_t> dirty;
   std::vector<int> dirtyList;
+  std::vector<int> priceWatch;  // per base index: watchers of its prices
+  PriceListener priceListener;
   Rng rng{0};
   std::uint32_t now = 0;
   std::uint64_t elapsedMs = 0;  // since the start of the session
@@ -319,6 +357,31 @@ struct Market::Impl {
   }
   void Event(int i, Rng& r);
   void StepOnce();
+
+  // The order book. An instrument someone watches keeps a book of its own
+  // from the moment interest first arrives (so the same interest changes give
+  // the same market); the others keep only their best prices and sizes, and
+  // their deeper levels are drawn from the price, so they stay put while the
+  // price does.
+  struct Level {
+    double price = 0;
+    std::int64_t size = 0;
+    std::int32_t orders = 0;
+  };
+  struct LiveBook {
+    std::vector<Level> bids, asks;  // best first; prices one step apart
+  };
+  std::unordered_map<int, LiveBook> books;
+  std::int64_t DrawnSize(int b, double price, int level, int side) const;
+  std::int32_t DrawnOrders(int b, std::int64_t size, int level, int side) const;
+  // Level 1 from the state, the rest drawn; up to `levels` per side.
+  LiveBook DrawBook(int b, int levels) const;
+  // Tops both sides up to `levels` at their far ends.
+  void Refill(int b, LiveBook& book, int levels) const;
+  // Where the walk leans: steps up (> 0) or down (< 0) from the middle.
+  int Lean(int i, const State& s, Rng& r) const;
+  // Last, day range, volume and turnover after a trade.
+  static void RecordTrade(State& s, const Trade& t);
 };
 
 void Market::Impl::AddInstrument(JInstrumentUnderlying rec, InstInfo inf) {
@@ -335,6 +398,7 @@ void Market::Impl::Build() {
   products = {
       {101, "ES", "Equities", ""}, {102, "CS", "Cash Securities", ""}, {103, "CFD", "Contracts for Difference", ""},
       {104, "FUT", "Futures", ""}, {105, "FX", "Foreign Exchange", ""}, {106, "DMA", "Direct Market Access", ""},
+      {107, "IDX", "Indices", ""},
   };
   for (JProduct& p : products) p.pictureFile = ".\\images\\Products\\" + p.productType + ".bmp";
   for (const ExchangeDef& e : kExchanges) exchanges.push_back({e.code, e.market, e.name, e.product});
@@ -393,12 +457,14 @@ void Market::Impl::Build() {
 
   // World indices.
   for (const FixedDef& f : kIndices) {
-    JInstrumentUnderlying rec = base(f.code, f.name, f.code, exIndex("WIDX"), 101, "ES", f.decimals, f.table, f.price, "");
+    // An index is a computed value: viewable, not tradeable, without an order book.
+    JInstrumentUnderlying rec = base(f.code, f.name, f.code, exIndex("WIDX"), 107, "IDX", f.decimals, f.table, f.price, "");
     rec.lotSize = 1;
-    rec.accessStatus = 1;  // viewable, not tradeable
+    rec.accessStatus = 1;
     rec.altAccessStatus = 1;
     InstInfo inf;
     inf.activity = 1.5f; inf.table = f.table; inf.decimals = f.decimals; inf.lot = 1; inf.ref = f.price;
+    inf.index = true;
     inf.exchange = std::uint8_t(exIndex("WIDX"));
     AddInstrument(rec, inf);
   }
@@ -425,7 +491,8 @@ void Market::Impl::Build() {
       char name[128];
       std::snprintf(name, sizeof name, "%s %s %d", f.name, kMonths[m], y);
       const double ref = f.price * (1.0 + 0.002 * k);
-      JInstrumentUnderlying rec = base(code, name, f.root, exIndex(f.exchange), 104, "FUT", f.decimals, f.table, ref, "");
+      // Traders type the contract code ("NKZ6"), not the root.
+      JInstrumentUnderlying rec = base(code, name, code, exIndex(f.exchange), 104, "FUT", f.decimals, f.table, ref, "");
       rec.lotSize = 1;
       rec.maxQty1 = 500;
       rec.maxQty2 = 200;
@@ -444,7 +511,10 @@ void Market::Impl::Build() {
   const int twins = remaining - equities;
   std::vector<std::uint64_t> counters(std::size(kExchanges), 0);
   std::unordered_set<std::string> names, codes;
-  std::uint64_t letterCounter = 0;
+  for (const JInstrumentUnderlying& rec : instruments) {
+    names.insert(rec.instrumentName);
+    codes.insert(rec.instrumentCode);  // no stock shares a ticker with an index, a currency or a future
+  }
   for (int k = 0; k < equities; ++k) {
     double pick = r.Uniform();
     int ex = 0;
@@ -455,27 +525,26 @@ void Market::Impl::Build() {
     }
     const ExchangeDef& E = kExchanges[ex];
     const std::uint64_t n = counters[ex]++;
-    std::string code;
-    if (ex == 0) code = SgxCode(n);
-    else if (ex == 1) code = DigitCode(n, 1, 99999, 5);
-    else if (ex == 2) code = DigitCode(n, 1300, 9999, 4);
-    else code = LetterCode(letterCounter++);  // one sequence for the letter-coded exchanges
-    // Codes are unique per product: the key of an instrument.
-    while (!codes.insert(code).second) code += 'X';
     const SectorDef& sec = kSectors[r.Range(0, int(std::size(kSectors)) - 1)];
-    std::string stem = std::string(kSyllA[r.Range(0, int(std::size(kSyllA)) - 1)]) +
-                       kSyllB[r.Range(0, int(std::size(kSyllB)) - 1)];
-    std::string name = stem + " " + sec.words[r.Range(0, 2)];
+    const std::string stem = std::string(kSyllA[r.Range(0, int(std::size(kSyllA)) - 1)]) +
+                             kSyllB[r.Range(0, int(std::size(kSyllB)) - 1)];
+    const std::string word = sec.words[r.Range(0, 2)];
+    std::string name = stem + " " + word;
     const double style = r.Uniform();
     if (style < 0.04) name = stem + " & Sons " + sec.words[0];
     else if (style < 0.06) name = "O'" + stem + " " + sec.words[1];
     else if (style < 0.20) name += E.product == 101 && ex >= 4 ? " Inc" : " Ltd";
-    if (!names.insert(name).second) name += " " + code;
-    std::string symbol;
-    for (char c : stem) symbol.push_back(char(std::toupper(static_cast<unsigned char>(c))));
-    symbol = symbol.substr(0, 6);
+    // Codes are unique per product (the key of an instrument). The letter-coded
+    // exchanges list tickers made from the company's name, as real ones do.
+    std::string code;
+    if (ex == 0) code = SgxCode(n);
+    else if (ex == 1) code = DigitCode(n, 1, 99999, 5);
+    else if (ex == 2) code = DigitCode(n, 1300, 9999, 4);
+    if (code.empty()) code = Ticker(stem, word, codes);
+    else while (!codes.insert(code).second) code += 'X';
+    name = UniqueName(name, code, names);
     const double ref = E.refLo * std::pow(E.refHi / E.refLo, std::pow(r.Uniform(), 1.3));
-    JInstrumentUnderlying rec = base(code, name, symbol, ex, 101, "ES", E.decimals, E.table, 0, sec.code);
+    JInstrumentUnderlying rec = base(code, name, code, ex, 101, "ES", E.decimals, E.table, 0, sec.code);
     InstInfo inf;
     const double u = r.Uniform();
     inf.activity = float(0.05 + 3.0 * u * u * u);
@@ -520,7 +589,8 @@ void Market::Impl::Build() {
     rec.productId = twinProducts[t];
     rec.productType = twinTypes[t];
     rec.chartCode = rec.exchangeCode + ":" + rec.instrumentCode + "." + twinTypes[t];
-    if (t == 0) rec.instrumentName += " CFD";
+    // Each twin reads apart from its underlying wherever a list shows them side by side.
+    rec.instrumentName += t == 0 ? " CFD" : t == 1 ? " DMA" : " Cash";
     InstInfo inf = info[of];
     inf.alias = of;
     inf.equity = false;
@@ -537,6 +607,7 @@ void Market::Impl::Build() {
     JInstrumentUnderlying rec = instruments[of];
     rec.instrumentCode = "[KELDO]" + rec.instrumentCode;
     rec.chartCode = rec.exchangeCode + ":" + instruments[of].instrumentCode + ".KELDO";
+    rec.instrumentName += " (Brantic)";
     rec.accessStatus = 3;
     rec.altAccessStatus = 3;
     InstInfo inf = info[of];
@@ -554,6 +625,7 @@ void Market::Impl::Build() {
   tapes.assign(n, {});
   interest.assign(n, 0);
   dirty.assign(n, 0);
+  priceWatch.assign(n, 0);
   for (int i : bases) {
     History(i, state[i], nullptr);
     Rng rr(StreamSeed(config.seed, std::uint64_t(i), 0xBEEF));
@@ -584,6 +656,15 @@ void Market::Impl::Build() {
   starters = {mine, asia, macro};
 }
 
+// The pull of the walk back towards the previous close, in standard
+// deviations of one move: weak enough that a price wanders through the day
+// (about 60% of the daily volatility away from the close at most times),
+// strong enough that a long session stays plausible.
+static double Pull(double ratioToClose, double sigmaFrac, double daily) {
+  const double spread = 0.6 * daily;
+  return -0.5 * sigmaFrac * std::log(ratioToClose) / (spread * spread);
+}
+
 Trade Market::Impl::NextTrade(int i, State& s, Rng& r, std::uint32_t timeMs) const {
   const InstInfo& inf = info[i];
   const double ref = s.close > 0 ? s.close : inf.ref;
@@ -595,7 +676,7 @@ Trade Market::Impl::NextTrade(int i, State& s, Rng& r, std::uint32_t timeMs) con
   const double daily = inf.equity || inf.alias >= 0 ? 0.014 : 0.006;
   const double sigmaFrac = daily / std::sqrt(std::max(50.0, double(inf.activity) * 8000.0));
   const double sigmaTicks = std::max(sigmaFrac * p0 / stepUp, 0.6);
-  const double pull = -0.03 * std::log(p0 / ref) / sigmaFrac;
+  const double pull = Pull(p0 / ref, sigmaFrac, daily);
   long ticks = std::lround((r.Normal() + pull) * sigmaTicks);
   double price = p0;
   if (ticks != 0) {
@@ -615,8 +696,7 @@ Trade Market::Impl::NextTrade(int i, State& s, Rng& r, std::uint32_t timeMs) con
   return t;
 }
 
-void Market::Impl::ApplyTrade(int i, State& s, const Trade& t, Rng& r) const {
-  const InstInfo& inf = info[i];
+void Market::Impl::RecordTrade(State& s, const Trade& t) {
   if (s.trades == 0 || s.open <= 0) { s.open = t.price; s.high = t.price; s.low = t.price; }
   s.high = std::max(s.high, t.price);
   s.low = std::min(s.low, t.price);
@@ -625,7 +705,15 @@ void Market::Impl::ApplyTrade(int i, State& s, const Trade& t, Rng& r) const {
   s.turnover += t.price * t.volume;
   ++s.trades;
   s.lastTradeMs = t.timeMs;
-  // The book follows the trade: a buy lifts the offer, a sell hits the bid.
+}
+
+void Market::Impl::ApplyTrade(int i, State& s, const Trade& t, Rng& r) const {
+  const InstInfo& inf = info[i];
+  RecordTrade(s, t);
+  ++s.version;
+  if (inf.index) return;
+  // Before the session: the best prices follow the trade (a buy lifts the
+  // offer, a sell hits the bid).
   const int spread = std::max(1, inf.spread + (r.Chance(0.2) ? 1 : 0));
   if (t.side == 1 || (t.side != 2 && r.Chance(0.5))) {
     s.ask = r.Chance(0.3) ? Snap(i, t.price + Step(inf.table, t.price, true)) : t.price;
@@ -641,7 +729,6 @@ void Market::Impl::ApplyTrade(int i, State& s, const Trade& t, Rng& r) const {
   if (s.bid >= s.ask) s.ask = Snap(i, s.bid + Step(inf.table, s.bid, true));
   s.bidVol = std::int64_t(inf.lot) * r.Range(1, 300);
   s.askVol = std::int64_t(inf.lot) * r.Range(1, 300);
-  ++s.version;
 }
 
 void Market::Impl::History(int i, State& s, std::vector<Trade>* tape) const {
@@ -668,7 +755,7 @@ void Market::Impl::History(int i, State& s, std::vector<Trade>* tape) const {
       ApplyTrade(i, s, tr, r);
       if (tape) tape->push_back(tr);
     }
-  } else {
+  } else if (!inf.index) {
     s.bid = Snap(i, inf.ref - Step(inf.table, inf.ref, false) * inf.spread);
     s.ask = Snap(i, inf.ref + Step(inf.table, inf.ref, true));
     s.bidVol = std::int64_t(inf.lot) * r.Range(1, 100);
@@ -677,34 +764,157 @@ void Market::Impl::History(int i, State& s, std::vector<Trade>* tape) const {
   s.version = 1;
 }
 
+std::int64_t Market::Impl::DrawnSize(int b, double price, int level, int side) const {
+  if (price <= 0) return 0;
+  const std::uint64_t key = std::uint64_t(std::llround(price * 10000.0)) * 4 + std::uint64_t(side);
+  const std::uint64_t h = Mix(StreamSeed(config.seed, std::uint64_t(b), key));
+  // Resting size is a good many of the usual trades, so most trades leave the best level standing.
+  return (8 + std::int64_t(h % std::uint64_t(60 + 12 * level))) * info[b].lot;
+}
+
+std::int32_t Market::Impl::DrawnOrders(int b, std::int64_t size, int level, int side) const {
+  if (size <= 0) return 0;
+  const std::int64_t lots = std::max<std::int64_t>(1, size / std::max(1, info[b].lot));
+  const std::uint64_t h = Mix(StreamSeed(config.seed, std::uint64_t(b), std::uint64_t(level) * 8 + std::uint64_t(side)));
+  return std::int32_t(std::min<std::int64_t>(lots, 1 + std::int64_t(h % std::uint64_t(1 + lots / 3))));
+}
+
+Market::Impl::LiveBook Market::Impl::DrawBook(int b, int levels) const {
+  LiveBook book;
+  const State& s = state[b];
+  if (info[b].index) return book;
+  if (s.bid > 0) book.bids.push_back({s.bid, s.bidVol, DrawnOrders(b, s.bidVol, 1, 1)});
+  if (s.ask > 0) book.asks.push_back({s.ask, s.askVol, DrawnOrders(b, s.askVol, 1, 2)});
+  Refill(b, book, levels);
+  return book;
+}
+
+void Market::Impl::Refill(int b, LiveBook& book, int levels) const {
+  const InstInfo& inf = info[b];
+  const double minPrice = Step(inf.table, 0, true);
+  auto add = [&](std::vector<Level>& side, double price, int sideCode) {
+    const int level = int(side.size()) + 1;
+    const std::int64_t size = DrawnSize(b, price, level, sideCode);
+    side.push_back({price, size, DrawnOrders(b, size, level, sideCode)});
+  };
+  while (!book.bids.empty() && int(book.bids.size()) < levels) {
+    const double p = book.bids.back().price;
+    const double next = p - Step(inf.table, p, false);
+    if (next < minPrice - 1e-12) break;
+    add(book.bids, Snap(b, next), 1);
+  }
+  while (!book.asks.empty() && int(book.asks.size()) < levels) {
+    const double p = book.asks.back().price;
+    add(book.asks, Snap(b, p + Step(inf.table, p, true)), 2);
+  }
+}
+
+int Market::Impl::Lean(int i, const State& s, Rng& r) const {
+  const InstInfo& inf = info[i];
+  const double ref = s.close > 0 ? s.close : inf.ref;
+  const double mid = s.bid > 0 && s.ask > 0 ? (s.bid + s.ask) / 2 : s.last > 0 ? s.last : ref;
+  // The walk of NextTrade, in steps from the middle of the spread.
+  const double daily = inf.equity || inf.alias >= 0 ? 0.014 : 0.006;
+  const double sigmaFrac = daily / std::sqrt(std::max(50.0, double(inf.activity) * 8000.0));
+  const double sigmaTicks = std::max(sigmaFrac * mid / Step(inf.table, mid, true), 0.6);
+  const double pull = Pull(mid / ref, sigmaFrac, daily);
+  return int(std::clamp<long>(std::lround((r.Normal() + pull) * sigmaTicks), -3, 3));
+}
+
 void Market::Impl::Event(int i, Rng& r) {
   Materialize(i);
   State& s = state[i];
   const InstInfo& inf = info[i];
-  if (r.Chance(0.55)) {
+  if (inf.index || s.ask <= 0) {
+    // An index ticks: a new value, no book.
     Trade t = NextTrade(i, s, r, TimeOfDay());
     ApplyTrade(i, s, t, r);
     tapes[i].push_back(t);
-    MarkDirty(i, kBookChanged | kTradeChanged);
-  } else {
-    // Quote-only move: sizes change, now and then a level is added or pulled.
-    const double u = r.Uniform();
-    if (u < 0.15 && s.bid > 0) {
-      const double nb = Snap(i, s.bid + Step(inf.table, s.bid, true));
-      if (nb < s.ask) s.bid = nb;
-    } else if (u < 0.30 && s.ask > 0) {
-      const double na = Snap(i, s.ask - Step(inf.table, s.ask, false));
-      if (na > s.bid) s.ask = na;
-    } else if (u < 0.40) {
-      s.bid = Snap(i, s.bid - Step(inf.table, s.bid, false));
-    } else if (u < 0.50) {
-      s.ask = Snap(i, s.ask + Step(inf.table, s.ask, true));
-    }
-    if (r.Chance(0.5)) s.bidVol = std::max<std::int64_t>(inf.lot, s.bidVol + std::int64_t(inf.lot) * r.Range(-40, 60));
-    else s.askVol = std::max<std::int64_t>(inf.lot, s.askVol + std::int64_t(inf.lot) * r.Range(-40, 60));
-    ++s.version;
-    MarkDirty(i, kBookChanged);
+    MarkDirty(i, kTradeChanged | (inf.index ? 0u : std::uint32_t(kBookChanged)));
+    if (priceWatch[i] > 0 && priceListener) priceListener(i);
+    return;
   }
+  auto live = books.find(i);
+  LiveBook scratch;
+  if (live == books.end()) scratch = DrawBook(i, 3);
+  LiveBook& book = live != books.end() ? live->second : scratch;
+  const int depth = live != books.end() ? kDepthLevels : 3;
+  const std::int64_t lot = std::max(1, inf.lot);
+  const int lean = Lean(i, s, r);
+  const bool leanSide = lean > 0 || (lean == 0 && r.Chance(0.5));  // true: towards the bids
+  std::uint32_t bits = kBookChanged;
+  // A spread wider than usual does not last: someone steps inside it.
+  const double bestBid = book.bids.empty() ? 0 : book.bids.front().price, bestAsk = book.asks.front().price;
+  const double step = Step(inf.table, bestBid > 0 ? bestBid : bestAsk, true);
+  const bool wide = bestBid > 0 && (bestAsk - bestBid) > step * (std::max(1, inf.spread) + 0.5);
+  const double u = wide && r.Chance(0.5) ? 0.37 : r.Uniform();
+  auto changeSize = [&](std::vector<Level>& side, int k, bool join) {
+    Level& L = side[std::size_t(k)];
+    if (join || L.size <= lot) {
+      L.size += lot * r.Range(1, 30);
+      ++L.orders;
+    } else {
+      L.size -= lot * r.Range(1, int(std::min<std::int64_t>(30, L.size / lot - 1)));
+      L.orders = std::max(1, L.orders - 1);
+    }
+    L.orders = std::int32_t(std::clamp<std::int64_t>(L.orders, 1, std::max<std::int64_t>(1, L.size / lot)));
+  };
+  if (u < 0.35 && !book.bids.empty()) {
+    // A trade takes liquidity at the best price: a buy from the best offer, a
+    // sell from the best bid. A strong lean takes the whole level.
+    const bool buy = leanSide;
+    std::vector<Level>& side = buy ? book.asks : book.bids;
+    Level& best = side.front();
+    std::int64_t volume = lot * std::int64_t(std::max(1.0, std::floor(std::exp(r.Normal() * 1.1) * 6.0)));
+    if ((std::abs(lean) >= 2 && r.Chance(0.5)) || volume > best.size) volume = best.size;
+    Trade t;
+    t.timeMs = TimeOfDay();
+    t.price = best.price;
+    t.volume = std::int32_t(std::min<std::int64_t>(volume, std::numeric_limits<std::int32_t>::max()));
+    t.side = buy ? 1 : 2;
+    best.size -= t.volume;
+    if (best.size <= 0 && r.Chance(0.5)) {
+      // Often the taken level is refilled at once (hidden size, a quick new order).
+      best.size = lot * r.Range(5, 40);
+      best.orders = 1;
+    } else if (best.size <= 0) {
+      side.erase(side.begin());
+    } else {
+      best.orders = std::int32_t(std::clamp<std::int64_t>(best.orders - 1, 1, best.size / lot));
+    }
+    RecordTrade(s, t);
+    tapes[i].push_back(t);
+    bits |= kTradeChanged;
+  } else if (u < 0.39 && !book.bids.empty()) {
+    // A new order inside the spread, on the side the market leans to.
+    const double price = leanSide ? Snap(i, bestBid + Step(inf.table, bestBid, true))
+                                  : Snap(i, bestAsk - Step(inf.table, bestAsk, false));
+    if (price > bestBid + 1e-9 && price < bestAsk - 1e-9) {
+      std::vector<Level>& side = leanSide ? book.bids : book.asks;
+      const std::int64_t size = lot * r.Range(1, 20);
+      side.insert(side.begin(), Level{price, size, 1});
+    } else {
+      changeSize(leanSide ? book.bids : book.asks, 0, true);
+    }
+  } else if (u < 0.398) {
+    // The best level on the side the market leans away from is withdrawn.
+    std::vector<Level>& side = leanSide ? book.asks : book.bids;
+    if (side.size() > 1) side.erase(side.begin());
+  } else {
+    // Most updates: an order joins or leaves one of the top levels.
+    std::vector<Level>& side = r.Chance(0.5) || book.bids.empty() ? book.asks : book.bids;
+    int k = 0;
+    while (k + 1 < int(side.size()) && k < 9 && r.Chance(0.45)) ++k;
+    changeSize(side, k, r.Chance(0.55));
+  }
+  Refill(i, book, depth);
+  s.bid = book.bids.empty() ? 0 : book.bids.front().price;
+  s.bidVol = book.bids.empty() ? 0 : book.bids.front().size;
+  s.ask = book.asks.front().price;
+  s.askVol = book.asks.front().size;
+  ++s.version;
+  MarkDirty(i, bits);
+  if (priceWatch[i] > 0 && priceListener) priceListener(i);
 }
 
 void Market::Impl::StepOnce() {
@@ -796,7 +1006,22 @@ JMarketInfo Market::MarketInfo(std::string_view exchangeCode) const {
 }
 double Market::StepAt(std::int32_t tableId, double price, bool up) const { return d->Step(tableId, price, up); }
 
+int Market::LiquidStock() const {
+  int best = -1;
+  for (int pass = 0; pass < 2 && best < 0; ++pass)
+    for (int i : d->bases) {
+      const InstInfo& inf = d->info[i];
+      if (!inf.equity || d->instruments[i].accessStatus != 3 || (pass == 0 && inf.exchange != 0)) continue;
+      if (best < 0 || inf.activity > d->info[best].activity) best = i;
+    }
+  return best;
+}
+
 void Market::AdvanceTo(std::uint32_t now) {
+  // Only whole steps are played; the rest of the stride stays owed to the next
+  // call, because `d->now` moves by whole steps only. A tick behind the
+  // market's (a clock stepped back) plays nothing.
+  if (std::int32_t(now - d->now) <= 0) return;
   std::uint32_t due = (now - d->now) / kStepMs;
   // A clock that jumped hours ahead (a suspended laptop) plays at most an hour.
   const std::uint32_t cap = 3600u * 1000u / kStepMs;
@@ -821,11 +1046,26 @@ std::string Market::DateText() const {
 std::string Market::TimeText() const { return Clock(d->TimeOfDay()); }
 std::uint32_t Market::TimeOfDayMs() const { return d->TimeOfDay(); }
 
+int Market::BaseOf(int index) const {
+  if (index < 0 || index >= int(d->instruments.size())) return -1;
+  return d->Base(index);
+}
+void Market::SetPriceListener(PriceListener listener) { d->priceListener = std::move(listener); }
+void Market::WatchPrices(int index) {
+  const int b = BaseOf(index);
+  if (b >= 0) ++d->priceWatch[b];
+}
+void Market::UnwatchPrices(int index) {
+  const int b = BaseOf(index);
+  if (b >= 0 && d->priceWatch[b] > 0) --d->priceWatch[b];
+}
+
 void Market::AddInterest(int index) {
   if (index < 0 || index >= int(d->instruments.size())) return;
   const int b = d->Base(index);
   if (d->interest[b]++ == 0) d->hotDirty = true;
   ++d->interestTotal;
+  if (!d->info[b].index && !d->books.count(b)) d->books.emplace(b, d->DrawBook(b, kDepthLevels));
 }
 void Market::RemoveInterest(int index) {
   if (index < 0 || index >= int(d->instruments.size())) return;
@@ -890,43 +1130,22 @@ std::vector<DepthLevel> Market::Book(int index, int levels) {
   if (index < 0 || index >= int(d->instruments.size())) return out;
   levels = std::clamp(levels, 0, int(kDepthLevels));
   const int b = d->Base(index);
-  const State& s = d->state[b];
-  const InstInfo& inf = d->info[b];
-  const double minPrice = d->Step(inf.table, 0, true);
-  // Sizes are a function of the price level, so they stay put while the
-  // level does; the top three levels also churn with every event.
-  auto size = [&](double price, int level, std::uint64_t side) -> std::int64_t {
-    if (price <= 0) return 0;
-    const std::uint64_t key = std::uint64_t(std::llround(price * 10000.0)) * 4 + side;
-    std::uint64_t h = Mix(StreamSeed(d->config.seed, std::uint64_t(b), key));
-    if (level <= 3) h = Mix(h ^ s.version);
-    return (1 + std::int64_t(h % std::uint64_t(40 + 12 * level))) * inf.lot;
-  };
-  auto orders = [&](std::int64_t vol, int level, std::uint64_t side) -> std::int32_t {
-    if (vol <= 0) return 0;
-    const std::int64_t lots = std::max<std::int64_t>(1, vol / std::max(1, inf.lot));
-    const std::uint64_t h = Mix(StreamSeed(d->config.seed, std::uint64_t(b),
-                                           std::uint64_t(level) * 8 + side + (level <= 3 ? s.version * 1024ull : 0)));
-    return std::int32_t(std::min<std::int64_t>(lots, 1 + std::int64_t(h % std::uint64_t(1 + lots / 3))));
-  };
-  double bid = s.bid, ask = s.ask;
-  out.reserve(std::size_t(levels));
-  for (int level = 1; level <= levels; ++level) {
-    if (level > 1) {
-      if (bid > 0) {
-        const double nb = bid - d->Step(inf.table, bid, false);
-        bid = nb < minPrice - 1e-12 ? 0 : d->Snap(b, nb);
-      }
-      if (ask > 0) ask = d->Snap(b, ask + d->Step(inf.table, ask, true));
+  auto live = d->books.find(b);
+  const Impl::LiveBook drawn = live == d->books.end() ? d->DrawBook(b, levels) : Impl::LiveBook{};
+  const Impl::LiveBook& book = live == d->books.end() ? drawn : live->second;
+  out.resize(std::size_t(levels));
+  for (int k = 0; k < levels; ++k) {
+    DepthLevel& L = out[std::size_t(k)];
+    if (k < int(book.bids.size())) {
+      L.bid = book.bids[std::size_t(k)].price;
+      L.bidVolume = book.bids[std::size_t(k)].size;
+      L.bidOrders = book.bids[std::size_t(k)].orders;
     }
-    DepthLevel L;
-    L.bid = bid;
-    L.ask = ask;
-    L.bidVolume = level == 1 ? (bid > 0 ? s.bidVol : 0) : size(bid, level, 1);
-    L.askVolume = level == 1 ? (ask > 0 ? s.askVol : 0) : size(ask, level, 2);
-    L.bidOrders = orders(L.bidVolume, level, 1);
-    L.askOrders = orders(L.askVolume, level, 2);
-    out.push_back(L);
+    if (k < int(book.asks.size())) {
+      L.ask = book.asks[std::size_t(k)].price;
+      L.askVolume = book.asks[std::size_t(k)].size;
+      L.askOrders = book.asks[std::size_t(k)].orders;
+    }
   }
   return out;
 }
@@ -1031,6 +1250,16 @@ std::string Market::SummaryPageText(int index, int page) {
   return out;
 }
 
+std::string Market::DepthFieldValue(int index, const DepthLevel& L, std::string_view f) const {
+  if (f == "BUY") return L.bid > 0 ? FormatPrice(index, L.bid) : std::string();
+  if (f == "SELL") return L.ask > 0 ? FormatPrice(index, L.ask) : std::string();
+  if (f == "BVOL") return L.bid > 0 ? std::to_string(L.bidVolume) : std::string();
+  if (f == "SVOL") return L.ask > 0 ? std::to_string(L.askVolume) : std::string();
+  if (f == "ORDS_BVOL") return L.bid > 0 ? std::to_string(L.bidOrders) : std::string();
+  if (f == "ORDS_SVOL") return L.ask > 0 ? std::to_string(L.askOrders) : std::string();
+  return {};
+}
+
 std::string Market::FieldValue(int index, std::string_view f, int param, int kind) {
   if (index < 0 || index >= int(d->instruments.size())) return {};
   const int b = d->Base(index);
@@ -1040,14 +1269,7 @@ std::string Market::FieldValue(int index, std::string_view f, int param, int kin
     if (kind == 1 || f == "BUY" || f == "SELL" || f == "ORDS_BVOL" || f == "ORDS_SVOL") {
       const int level = kind == 1 ? param : 1;
       if (level < 1 || level > kDepthLevels) return {};
-      const DepthLevel L = Depth(index, level);
-      if (f == "BUY") return price(L.bid);
-      if (f == "SELL") return price(L.ask);
-      if (f == "BVOL") return L.bid > 0 ? std::to_string(L.bidVolume) : std::string();
-      if (f == "SVOL") return L.ask > 0 ? std::to_string(L.askVolume) : std::string();
-      if (f == "ORDS_BVOL") return L.bid > 0 ? std::to_string(L.bidOrders) : std::string();
-      if (f == "ORDS_SVOL") return L.ask > 0 ? std::to_string(L.askOrders) : std::string();
-      return {};
+      return DepthFieldValue(index, Depth(index, level), f);
     }
     if (f == "BID") return price(s.bid);
     if (f == "ASK") return price(s.ask);
@@ -1155,88 +1377,5 @@ std::vector<int> Market::WorldIndices() const {
 const std::vector<StarterWatchlist>& Market::StarterWatchlists() const { return d->starters; }
 
 // ---------------------------------------------------------------------------
-
-void AlertBook::Load(std::vector<PriceAlertItem> alerts) {
-  alerts_ = std::move(alerts);
-  conditionWasTrue_.assign(alerts_.size(), false);
-  nextId_ = 1;
-  for (const auto& a : alerts_) nextId_ = std::max(nextId_, a.alertId + 1);
-}
-
-std::int32_t AlertBook::Create(PriceAlertItem item) {
-  item.alertId = nextId_++;
-  item.status = "Active";
-  item.hostTextA.clear();
-  item.hostTextB.clear();
-  item.hostNumber = 0;
-  alerts_.push_back(std::move(item));
-  conditionWasTrue_.push_back(false);
-  return alerts_.back().alertId;
-}
-
-bool AlertBook::Update(const PriceAlertItem& item) {
-  for (std::size_t k = 0; k < alerts_.size(); ++k) {
-    if (alerts_[k].alertId != item.alertId) continue;
-    PriceAlertItem kept = item;
-    // A changed alert watches again from now on.
-    kept.status = "Active";
-    kept.hostTextA = alerts_[k].hostTextA;
-    kept.hostTextB = alerts_[k].hostTextB;
-    kept.hostNumber = alerts_[k].hostNumber;
-    alerts_[k] = std::move(kept);
-    conditionWasTrue_[k] = false;
-    return true;
-  }
-  return false;
-}
-
-int AlertBook::Remove(const std::vector<std::int32_t>& ids) {
-  int removed = 0;
-  for (std::size_t k = alerts_.size(); k-- > 0;) {
-    if (std::find(ids.begin(), ids.end(), alerts_[k].alertId) == ids.end()) continue;
-    alerts_.erase(alerts_.begin() + long(k));
-    conditionWasTrue_.erase(conditionWasTrue_.begin() + long(k));
-    ++removed;
-  }
-  return removed;
-}
-
-const PriceAlertItem* AlertBook::Find(std::int32_t id) const {
-  for (const auto& a : alerts_) if (a.alertId == id) return &a;
-  return nullptr;
-}
-
-std::vector<AlertBook::Fired> AlertBook::Evaluate(Market& market, bool* changed) {
-  std::vector<Fired> fired;
-  bool any = false;
-  const std::string today = market.DateText();
-  for (std::size_t k = 0; k < alerts_.size(); ++k) {
-    PriceAlertItem& a = alerts_[k];
-    const bool live = a.status == "Active" || (a.status == "Triggered" && !a.triggerOnce);
-    if (!live) continue;
-    if (!a.validUntil.empty() && a.validUntil < today) {
-      a.status = "Expired";
-      any = true;
-      continue;
-    }
-    const int idx = market.Find(a.productId, a.instrumentCode);
-    if (idx < 0) continue;
-    const Quote q = market.QuoteOf(idx);
-    const double v = a.priceField == "ASK" ? q.ask : a.priceField == "BID" ? q.bid : q.last;
-    if (v <= 0) continue;
-    const bool holds = a.comparator == "<=" ? v <= a.triggerValue + 1e-9 : v >= a.triggerValue - 1e-9;
-    if (holds && !conditionWasTrue_[k]) {
-      a.status = "Triggered";
-      a.hostNumber += 1;
-      a.hostTextA = today + " " + market.TimeText();
-      a.hostTextB = market.FormatPrice(idx, v);
-      fired.push_back({a, v});
-      any = true;
-    }
-    conditionWasTrue_[k] = holds;
-  }
-  if (changed) *changed = any;
-  return fired;
-}
 
 }  // namespace sim

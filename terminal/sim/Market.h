@@ -4,18 +4,21 @@
 // Reference data (products, exchanges, instruments, price-step tables, sectors)
 // is generated once from the seed. Prices follow a seeded random walk per
 // instrument; quotes, a 99-level book, the trade tape and the trade summary
-// stay coherent with each other. Time moves only through AdvanceTo(tick), in
+// stay coherent with each other. The book changes as real ones do: most
+// updates change the size at one of the top levels, the best price moves now
+// and then, and trades take liquidity at the best price. Indices tick a value
+// and have no book. Time moves only through AdvanceTo(tick), in
 // fixed steps of `kStepMs`, so the same seed and the same sequence of ticks
 // (and of interest changes) give the same market.
 //
 // Plain C++, no Qt, single-threaded.
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "hostview/AlertRecords.h"
 #include "hostview/HostLists.h"
 #include "hostview/Records.h"
 
@@ -109,11 +112,14 @@ class Market {
   const JExchangeList* FindExchange(std::string_view code) const;
   const JProduct* FindProduct(std::int64_t productId) const;
   JMarketInfo MarketInfo(std::string_view exchangeCode) const;
+  // The busiest tradeable stock of the home exchange (what a first start shows).
+  int LiquidStock() const;
   // The step at `price` in `tableId` (table 0 when the table has no band there).
   double StepAt(std::int32_t tableId, double price, bool up = true) const;
 
   // ---- Time ----------------------------------------------------------------------
-  // Runs every whole step up to `now` (unsigned tick difference from the last).
+  // Runs every whole step up to `now` (unsigned tick difference from the last);
+  // what is left of a partial step counts towards the next call.
   void AdvanceTo(std::uint32_t now);
   std::uint32_t Now() const;
   // Session clock: "YYYY-MM-DD", "HH:MM:SS", milliseconds since midnight.
@@ -136,6 +142,18 @@ class Market {
   // The same with what changed about each.
   std::vector<std::pair<int, std::uint32_t>> TakeChangedWithBits();
 
+  // ---- Price watch -------------------------------------------------------------------
+  // The instrument whose prices an instrument shows (a brand twin shows its
+  // original's); `index` itself for most.
+  int BaseOf(int index) const;
+  // Called inside AdvanceTo after every event that may move the bid, ask or
+  // last price of a watched instrument, with its base index; the market time
+  // is the time of the change. Counted: Watch twice needs Unwatch twice.
+  using PriceListener = std::function<void(int baseIndex)>;
+  void SetPriceListener(PriceListener listener);
+  void WatchPrices(int index);
+  void UnwatchPrices(int index);
+
   // ---- Values ---------------------------------------------------------------------
   Quote QuoteOf(int index);
   DepthLevel Depth(int index, int level);   // level 1..99
@@ -150,6 +168,10 @@ class Market {
   // of page `param`; kind 3: trade-summary header fields or "TRADEDATA" of
   // summary page `param`.
   std::string FieldValue(int index, std::string_view field, int param, int kind);
+  // A depth field ("BUY", "SELL", "BVOL", "SVOL", "ORDS_BVOL", "ORDS_SVOL") of
+  // one book level of instrument `index`; "" for an empty side or another
+  // field. FieldValue and the host's depth pushes both format through here.
+  std::string DepthFieldValue(int index, const DepthLevel& level, std::string_view field) const;
 
   // Text layouts.
   std::string TradePageText(int index, int page);    // "TRADEDATA" of a page (1..999, 99998)
@@ -169,37 +191,6 @@ class Market {
 
  private:
   std::unique_ptr<Impl> d;
-};
-
-// Keeps the price alerts and moves them through their states.
-class AlertBook {
- public:
-  // Replaces all alerts (loaded from the store); the next id follows the highest.
-  void Load(std::vector<PriceAlertItem> alerts);
-  // Returns the new id; status becomes "Active".
-  std::int32_t Create(PriceAlertItem item);
-  // False when the id is unknown. The status stays the terminal's.
-  bool Update(const PriceAlertItem& item);
-  // Number of alerts removed.
-  int Remove(const std::vector<std::int32_t>& ids);
-  const std::vector<PriceAlertItem>& All() const { return alerts_; }
-  const PriceAlertItem* Find(std::int32_t id) const;
-
-  struct Fired {
-    PriceAlertItem alert;  // after the change
-    double value = 0;
-  };
-  // Checks every live alert against the market at its current time: an alert
-  // whose validUntil lies before the session date becomes "Expired"; one whose
-  // condition holds becomes "Triggered" (a repeating alert fires again each time
-  // the condition turns true again). Returns the alerts that fired; `changed`
-  // is set when any status changed.
-  std::vector<Fired> Evaluate(Market& market, bool* changed);
-
- private:
-  std::vector<PriceAlertItem> alerts_;
-  std::vector<bool> conditionWasTrue_;
-  std::int32_t nextId_ = 1;
 };
 
 }  // namespace sim

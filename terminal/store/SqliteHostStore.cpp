@@ -139,6 +139,19 @@ void SqliteHostStore::SaveAlerts(const std::vector<PriceAlertItem>& alerts) {
   if (!m_store.SaveAlerts(rows)) Report("saving the alerts");
 }
 
+void SqliteHostStore::SaveAlertFiring(const AlertFiring& f) {
+  const AlertFiringRow row{f.alertId, f.firedAt, f.priceField, f.comparator, f.threshold, f.value, f.valueText, f.notice};
+  if (!m_store.AddAlertFiring(row)) Report("saving an alert firing");
+}
+
+std::vector<AlertFiring> SqliteHostStore::LoadAlertFirings(std::int32_t alertId) {
+  std::vector<AlertFiring> out;
+  for (const AlertFiringRow& r : m_store.LoadAlertFirings(alertId))
+    out.push_back({static_cast<std::int32_t>(r.alertId), r.firedAt, r.priceField, r.comparator, r.threshold, r.value,
+                   r.valueText, r.notice});
+  return out;
+}
+
 std::map<std::string, std::string> SqliteHostStore::LoadSettings() { return m_store.LoadSettings(kSettingPrefix); }
 
 void SqliteHostStore::SaveSetting(const std::string& key, const std::string& value) {

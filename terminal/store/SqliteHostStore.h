@@ -17,6 +17,8 @@ class SqliteHostStore : public IHostStore {
   void SaveWatchlists(StoredWatchlist::Kind kind, const std::vector<StoredWatchlist>& lists) override;
   bool LoadAlerts(std::vector<PriceAlertItem>& out) override;
   void SaveAlerts(const std::vector<PriceAlertItem>& alerts) override;
+  void SaveAlertFiring(const AlertFiring& firing) override;
+  std::vector<AlertFiring> LoadAlertFirings(std::int32_t alertId) override;
   std::map<std::string, std::string> LoadSettings() override;
   void SaveSetting(const std::string& key, const std::string& value) override;
 

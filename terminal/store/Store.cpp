@@ -6,6 +6,7 @@
 #include <chrono>
 #include <cstdlib>
 #include <ctime>
+#include <iterator>
 #include <system_error>
 
 namespace term {
@@ -51,6 +52,45 @@ CREATE TABLE layout_state (
 );
 )sql";
 
+// Each step brings a database of format N to N + 1; kSchema plus every step is
+// the current format. Steps only add, so an older terminal's data stays.
+const char* const kUpgrades[] = {
+    // 1 -> 2: the blotter.
+    R"sql(
+CREATE TABLE orders (
+  number          INTEGER PRIMARY KEY,
+  session         TEXT NOT NULL,
+  time            TEXT NOT NULL,
+  side            TEXT NOT NULL,
+  product_id      INTEGER NOT NULL,
+  instrument_code TEXT NOT NULL,
+  quantity        INTEGER NOT NULL,
+  price           REAL NOT NULL,
+  type            TEXT NOT NULL,
+  validity        TEXT NOT NULL,
+  trigger_type    TEXT NOT NULL,
+  status          TEXT NOT NULL
+);
+CREATE INDEX orders_by_session ON orders(session, number);
+)sql",
+    // 2 -> 3: every firing of a price alert with its notice, kept with the alert.
+    R"sql(
+CREATE TABLE alert_firings (
+  seq         INTEGER PRIMARY KEY AUTOINCREMENT,
+  alert_id    INTEGER NOT NULL,
+  fired_at    TEXT NOT NULL,
+  price_field TEXT NOT NULL,
+  comparator  TEXT NOT NULL,
+  threshold   REAL NOT NULL,
+  value       REAL NOT NULL,
+  value_text  TEXT NOT NULL,
+  notice      TEXT NOT NULL
+);
+CREATE INDEX alert_firings_by_alert ON alert_firings(alert_id, seq);
+)sql",
+};
+static_assert(std::size(kUpgrades) == Store::kSchemaVersion - 1, "one upgrade step per format");
+
 // RAII prepared statement. Connections close with sqlite3_close_v2, which
 // waits for statements still alive instead of leaking the connection.
 class Stmt {
@@ -59,6 +99,7 @@ class Stmt {
   ~Stmt() { sqlite3_finalize(m_stmt); }
   bool ok() const { return m_rc == SQLITE_OK && m_stmt; }
   Stmt& Bind(int i, std::int64_t v) { sqlite3_bind_int64(m_stmt, i, v); return *this; }
+  Stmt& BindReal(int i, double v) { sqlite3_bind_double(m_stmt, i, v); return *this; }
   Stmt& Bind(int i, const std::string& v) {
     sqlite3_bind_text(m_stmt, i, v.data(), static_cast<int>(v.size()), SQLITE_TRANSIENT);
     return *this;
@@ -76,6 +117,7 @@ class Stmt {
     return rc == SQLITE_DONE;
   }
   std::int64_t Int(int col) const { return sqlite3_column_int64(m_stmt, col); }
+  double Real(int col) const { return sqlite3_column_double(m_stmt, col); }
   std::string Text(int col) const {
     const void* p = sqlite3_column_blob(m_stmt, col);
     const int n = sqlite3_column_bytes(m_stmt, col);
@@ -203,8 +245,8 @@ std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report,
   const fs::path path = dir / kFileName;
   report.path = path;
   report.outcome = StoreOpenReport::Outcome::Created;
+  int version = 0;
   if (fs::exists(path)) {
-    int version = 0;
     std::string detail;
     switch (ProbeFile(path, version, detail)) {
       case Probe::Ours:
@@ -248,19 +290,31 @@ std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report,
     error = "cannot prepare " + path.string() + ": " + store->m_error;
     return nullptr;
   }
-  if (report.outcome != StoreOpenReport::Outcome::Opened) {
+  const bool fresh = report.outcome != StoreOpenReport::Outcome::Opened;
+  const int from = fresh ? 1 : std::max(1, version);
+  if (fresh || from < kSchemaVersion) {
+    // One transaction: a database is either upgraded whole or left as it was.
     Transaction tx(*store);
-    if (!tx.open() || !store->Exec(kSchema) ||
-        !store->Exec(("PRAGMA application_id=" + std::to_string(kApplicationId)).c_str()) ||
-        !store->Exec(("PRAGMA user_version=" + std::to_string(kSchemaVersion)).c_str()) || !tx.Commit()) {
-      error = "cannot create " + path.string() + ": " + store->m_error;
+    bool ok = tx.open() && (!fresh || store->Exec(kSchema));
+    for (int v = from; ok && v < kSchemaVersion; ++v) ok = store->Exec(kUpgrades[v - 1]);
+    ok = ok && store->Exec(("PRAGMA application_id=" + std::to_string(kApplicationId)).c_str()) &&
+         store->Exec(("PRAGMA user_version=" + std::to_string(kSchemaVersion)).c_str()) && tx.Commit();
+    if (!ok) {
+      error = std::string(fresh ? "cannot create " : "cannot bring up to date ") + path.string() + ": " +
+              store->m_error;
       return nullptr;
     }
+    if (!fresh) report.upgradedFrom = from;
   }
   return store;
 }
 
 Store::~Store() { sqlite3_close_v2(m_db); }
+
+int Store::UserVersion() {
+  Stmt s(m_db, "PRAGMA user_version");
+  return s.ok() && s.Step() == SQLITE_ROW ? static_cast<int>(s.Int(0)) : -1;
+}
 
 bool Store::Exec(const char* sql) {
   char* msg = nullptr;
@@ -369,8 +423,33 @@ bool Store::SaveAlerts(const std::vector<AlertRow>& alerts) {
   if (!ins.ok()) return Fail("save alerts");
   for (const auto& a : alerts)
     if (!ins.Bind(1, a.id).Bind(2, a.body).Run()) return Fail("save alerts");
+  if (!Exec("DELETE FROM alert_firings WHERE alert_id NOT IN (SELECT id FROM alerts)")) return false;
   if (!MarkSaved("alerts")) return Fail("save alerts");
   return tx.Commit();
+}
+
+bool Store::AddAlertFiring(const AlertFiringRow& f) {
+  Transaction tx(*this);
+  if (!tx.open()) return false;
+  Stmt ins(m_db,
+           "INSERT INTO alert_firings(alert_id, fired_at, price_field, comparator, threshold, value, value_text, notice) "
+           "VALUES(?, ?, ?, ?, ?, ?, ?, ?)");
+  if (!ins.ok() || !ins.Bind(1, f.alertId).Bind(2, f.firedAt).Bind(3, f.priceField).Bind(4, f.comparator)
+                        .BindReal(5, f.threshold).BindReal(6, f.value).Bind(7, f.valueText).Bind(8, f.notice).Run())
+    return Fail("save an alert firing");
+  return tx.Commit();
+}
+
+std::vector<AlertFiringRow> Store::LoadAlertFirings(std::int64_t alertId) {
+  std::vector<AlertFiringRow> out;
+  Stmt s(m_db,
+         "SELECT alert_id, fired_at, price_field, comparator, threshold, value, value_text, notice FROM alert_firings "
+         "WHERE alert_id = ? ORDER BY seq");
+  if (!s.ok()) { Fail("load alert firings"); return out; }
+  s.Bind(1, alertId);
+  while (s.Step() == SQLITE_ROW)
+    out.push_back({s.Int(0), s.Text(1), s.Text(2), s.Text(3), s.Real(4), s.Real(5), s.Text(6), s.Text(7)});
+  return out;
 }
 
 SavedLayout Store::LoadLayout() {
@@ -412,6 +491,38 @@ bool Store::SaveLayout(const SavedLayout& layout) {
       !st.Bind(1, std::string("active")).BindBlob(2, layout.activeView).Run())
     return Fail("save layout");
   return tx.Commit();
+}
+
+std::vector<OrderRow> Store::LoadOrders(const std::string& session) {
+  std::vector<OrderRow> out;
+  Stmt s(m_db,
+         "SELECT number, session, time, side, product_id, instrument_code, quantity, price, type, validity, "
+         "trigger_type, status FROM orders WHERE session = ? ORDER BY number");
+  if (!s.ok()) { Fail("load orders"); return out; }
+  s.Bind(1, session);
+  while (s.Step() == SQLITE_ROW)
+    out.push_back({s.Int(0), s.Text(1), s.Text(2), s.Text(3), s.Int(4), s.Text(5), s.Int(6), s.Real(7), s.Text(8),
+                   s.Text(9), s.Text(10), s.Text(11)});
+  return out;
+}
+
+bool Store::SaveOrder(const OrderRow& o) {
+  Transaction tx(*this);
+  if (!tx.open()) return false;
+  Stmt up(m_db,
+          "INSERT OR REPLACE INTO orders(number, session, time, side, product_id, instrument_code, quantity, price, "
+          "type, validity, trigger_type, status) VALUES(?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)");
+  if (!up.ok() || !up.Bind(1, o.number).Bind(2, o.session).Bind(3, o.time).Bind(4, o.side).Bind(5, o.productId)
+                       .Bind(6, o.instrumentCode).Bind(7, o.quantity).BindReal(8, o.price).Bind(9, o.type)
+                       .Bind(10, o.validity).Bind(11, o.trigger).Bind(12, o.status).Run())
+    return Fail("save order");
+  return tx.Commit();
+}
+
+std::int64_t Store::LastOrderNumber() {
+  Stmt s(m_db, "SELECT coalesce(max(number), 0) FROM orders");
+  if (!s.ok() || s.Step() != SQLITE_ROW) { Fail("load orders"); return 0; }
+  return s.Int(0);
 }
 
 std::string EncodeParams(const std::map<std::string, std::string>& params) {

@@ -21,7 +21,7 @@ namespace term {
 
 struct StoreOpenReport {
   enum class Outcome {
-    Opened,           // an existing database, in use
+    Opened,           // an existing database, in use (brought up to this terminal's format when older)
     Created,          // no database yet; a new one was made
     ReplacedCorrupt,  // the old one was unreadable; set aside, new one made
     ReplacedNewer,    // the old one came from a newer terminal; set aside, new one made
@@ -30,6 +30,7 @@ struct StoreOpenReport {
   std::filesystem::path path;          // the database in use
   std::filesystem::path setAsidePath;  // where the old database went (Replaced*)
   std::string message;                 // one line for the user (empty when Opened/Created)
+  int upgradedFrom = 0;                // format of an older database brought up to date (0: none)
 };
 
 // One watchlist as the terminal keeps it. `body` is the terminal's own text
@@ -47,6 +48,19 @@ struct AlertRow {
   std::string body;
 };
 
+// One firing of a price alert, kept with the alert (the notice the terminal
+// showed, and the price and time that met the condition).
+struct AlertFiringRow {
+  std::int64_t alertId = 0;
+  std::string firedAt;     // "YYYY-MM-DD HH:MM:SS"
+  std::string priceField;
+  std::string comparator;
+  double threshold = 0.0;
+  double value = 0.0;
+  std::string valueText;
+  std::string notice;
+};
+
 // One open view of the saved layout, in opening order.
 struct SavedView {
   std::string className;
@@ -54,6 +68,19 @@ struct SavedView {
   std::int64_t productId = -1;
   std::string instrumentCode;
   std::map<std::string, std::string> params;  // start parameters, UTF-8
+};
+
+// One order of the blotter. `number` is the order number the user reads (unique).
+struct OrderRow {
+  std::int64_t number = 0;
+  std::string session;  // trading day "YYYY-MM-DD" it was placed on
+  std::string time;     // "HH:MM:SS" market time
+  std::string side;     // "Buy", "Sell"
+  std::int64_t productId = 0;
+  std::string instrumentCode;
+  std::int64_t quantity = 0;
+  double price = 0;
+  std::string type, validity, trigger, status;
 };
 
 struct SavedLayout {
@@ -66,7 +93,8 @@ struct SavedLayout {
 
 class Store {
  public:
-  static constexpr int kSchemaVersion = 1;
+  // 1: settings, watchlists, alerts, layout. 2: the blotter's orders. 3: alert firings.
+  static constexpr int kSchemaVersion = 3;
   static constexpr const char* kFileName = "terminal.db";
 
   // $XDG_DATA_HOME/marketviews-terminal, or ~/.local/share/marketviews-terminal.
@@ -101,16 +129,27 @@ class Store {
   bool HasSavedWatchlists(std::int32_t kind);
   bool HasSavedAlerts();
 
-  // Alerts in id order. Save replaces them all.
+  // Alerts in id order. Save replaces them all; the firings of alerts that
+  // are no longer there go with them.
   std::vector<AlertRow> LoadAlerts();
   bool SaveAlerts(const std::vector<AlertRow>& alerts);
+  // Appends one firing to an alert's history; its firings oldest first.
+  bool AddAlertFiring(const AlertFiringRow& firing);
+  std::vector<AlertFiringRow> LoadAlertFirings(std::int64_t alertId);
 
   SavedLayout LoadLayout();
   bool SaveLayout(const SavedLayout& layout);
 
+  // The orders of one trading day, by number. Save adds or replaces one order.
+  std::vector<OrderRow> LoadOrders(const std::string& session);
+  bool SaveOrder(const OrderRow& order);
+  // The highest order number ever saved (0 when none): numbers are never reused.
+  std::int64_t LastOrderNumber();
+
  private:
   explicit Store(sqlite3* db, std::filesystem::path path) : m_db(db), m_path(std::move(path)) {}
   bool Exec(const char* sql);
+  int UserVersion();
   bool Fail(const char* what);
   bool MarkSaved(const std::string& set);
   bool HasSaved(const std::string& set);

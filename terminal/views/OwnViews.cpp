@@ -24,9 +24,13 @@
 #include <QValueAxis>
 #include <QVBoxLayout>
 #include <cmath>
+#include <map>
 
+#include "hostview/DragData.h"
+#include "hostview/StyleRoles.h"
 #include "terminal/host/HostRuntime.h"
 #include "terminal/sim/Market.h"
+#include "terminal/views/Blotter.h"
 
 namespace term::views {
 
@@ -57,6 +61,12 @@ QString JsonEscape(const std::string& s) {
   return out;
 }
 
+QString SectorName(const sim::Market& m, const std::string& code) {
+  for (const auto& s : m.Sectors())
+    if (s.sectorCode == code) return QString::fromStdString(s.sectorName);
+  return code.empty() ? QStringLiteral("-") : QString::fromStdString(code);
+}
+
 QTableWidget* MakeTable(const QStringList& headings, QWidget* parent) {
   auto* t = new QTableWidget(0, static_cast<int>(headings.size()), parent);
   t->setHorizontalHeaderLabels(headings);
@@ -77,22 +87,29 @@ void SetRow(QTableWidget* t, int row, const QStringList& cells) {
 
 }  // namespace
 
-std::vector<BlotterOrder>& Blotter() {
-  static std::vector<BlotterOrder> orders;
-  return orders;
-}
-
 // ---- Trade ticket -----------------------------------------------------------
 
 void CTradeView::Build() {
   auto* layout = new QVBoxLayout(this);
   auto* form = new QFormLayout;
   m_instrumentLabel = new QLabel(this);
-  m_quoteLabel = new QLabel(this);
   m_side = new QComboBox(this);
   m_side->addItems({"Buy", "Sell"});
+  if (Blotter* b = CurrentBlotter()) m_side->setCurrentText(b->LastSide());
   m_price = new QDoubleSpinBox(this);
+  m_price->setObjectName("price");
   m_price->setRange(0, 1e9);
+  // The live quote beside the price: a ticket left open shows how far the market went.
+  m_bidLabel = new QLabel(this);
+  m_bidLabel->setObjectName("live-bid");
+  m_askLabel = new QLabel(this);
+  m_askLabel->setObjectName("live-ask");
+  m_lastLabel = new QLabel(this);
+  auto* priceRow = new QHBoxLayout;
+  priceRow->addWidget(m_price, 1);
+  priceRow->addWidget(m_bidLabel);
+  priceRow->addWidget(m_askLabel);
+  priceRow->addWidget(m_lastLabel);
   m_quantity = new QSpinBox(this);
   m_quantity->setRange(0, 1000000000);
   m_type = new QComboBox(this);
@@ -101,9 +118,8 @@ void CTradeView::Build() {
   m_validity->addItems({"Day", "Good till cancelled", "Fill and kill"});
   m_trigger = new QLabel("-", this);
   form->addRow("Instrument", m_instrumentLabel);
-  form->addRow("Quote", m_quoteLabel);
   form->addRow("Side", m_side);
-  form->addRow("Price", m_price);
+  form->addRow("Price", priceRow);
   form->addRow("Quantity", m_quantity);
   form->addRow("Order type", m_type);
   form->addRow("Validity", m_validity);
@@ -120,6 +136,16 @@ void CTradeView::Build() {
   layout->addWidget(m_blotter, 1);
   connect(m_place, &QPushButton::clicked, this, [this] { PlaceOrder(); });
   connect(m_type, &QComboBox::currentTextChanged, this, [this](const QString& t) { m_price->setEnabled(t != "Market"); });
+  // The user's choice of side is the next ticket's side too.
+  connect(m_side, &QComboBox::activated, this, [this] {
+    if (Blotter* b = CurrentBlotter()) b->SetLastSide(m_side->currentText());
+  });
+}
+
+double CTradeView::price() const { return m_price ? m_price->value() : 0; }
+QString CTradeView::side() const { return m_side ? m_side->currentText() : QString(); }
+QString CTradeView::liveQuote() const {
+  return m_bidLabel ? m_bidLabel->text() + "  " + m_askLabel->text() : QString();
 }
 
 void CTradeView::InstrumentChanged() {
@@ -127,13 +153,19 @@ void CTradeView::InstrumentChanged() {
   m_instrumentLabel->setText(ins ? InstrumentLabel() + " (" + QString::fromStdString(ins->exchangeCode) + ")"
                                  : QStringLiteral("(none)"));
   if (!ins) return;
+  // Decimals first: a price set before would be rounded to the old ones.
   m_price->setDecimals(std::clamp(ins->decimals, 0, 8));
   m_quantity->setSingleStep(static_cast<int>(std::max<std::int64_t>(1, ins->lotSize)));
   if (m_quantity->value() == 0) m_quantity->setValue(static_cast<int>(std::max<std::int64_t>(1, ins->lotSize)));
-  if (m_price->value() == 0) {
-    const auto& q = MarketOrNull()->QuoteOf(m_instrument);
+  const auto& q = MarketOrNull()->QuoteOf(m_instrument);
+  if (m_linkPrice > 0) {
+    m_price->setValue(m_linkPrice);
+    m_linkPrice = 0;
+  } else if (m_price->value() == 0) {
     m_price->setValue(m_side->currentText() == "Buy" ? q.ask : q.bid);
   }
+  const double at = m_price->value() > 0 ? m_price->value() : std::max(q.last, q.close);
+  m_price->setSingleStep(MarketOrNull()->StepAt(ins->priceStepTableId, at > 0 ? at : 1.0));
 }
 
 void CTradeView::TakeLink(const std::map<std::string, std::string>& link) {
@@ -144,8 +176,10 @@ void CTradeView::TakeLink(const std::map<std::string, std::string>& link) {
   if (const QString side = get("Field_side"); side.compare("Sell", Qt::CaseInsensitive) == 0) m_side->setCurrentIndex(1);
   else if (side.compare("Buy", Qt::CaseInsensitive) == 0) m_side->setCurrentIndex(0);
   bool ok = false;
-  if (const double p = get("Field_Trade_price").toDouble(&ok); ok && p > 0) m_price->setValue(p);
-  else m_price->setValue(0);  // taken from the quote once the instrument is known
+  // The clicked price is kept as it was; without one the ticket starts at the touch.
+  const double p = get("Field_Trade_price").toDouble(&ok);
+  m_linkPrice = ok && p > 0 ? p : 0;
+  m_price->setValue(0);
   if (const qlonglong q = get("Field_qty").toLongLong(&ok); ok && q > 0) m_quantity->setValue(static_cast<int>(q));
   if (const QString type = get("Field_Order_type"); !type.isEmpty()) {
     if (m_type->findText(type) < 0) m_type->addItem(type);
@@ -160,31 +194,24 @@ void CTradeView::TakeLink(const std::map<std::string, std::string>& link) {
 }
 
 void CTradeView::Refresh() {
-  if (const auto* ins = InstrumentAt(m_instrument)) {
+  if (InstrumentAt(m_instrument)) {
     const auto& q = MarketOrNull()->QuoteOf(m_instrument);
-    m_quoteLabel->setText(QString("Bid %1  Ask %2  Last %3")
-                              .arg(Price(m_instrument, q.bid), Price(m_instrument, q.ask), Price(m_instrument, q.last)));
-    (void)ins;
+    m_bidLabel->setText("Bid " + Price(m_instrument, q.bid));
+    m_askLabel->setText("Ask " + Price(m_instrument, q.ask));
+    m_lastLabel->setText("Last " + Price(m_instrument, q.last));
   } else {
-    m_quoteLabel->setText("-");
-  }
-  // Working orders fill once the market reaches them.
-  if (sim::Market* m = MarketOrNull()) {
-    for (auto& o : Blotter()) {
-      if (o.status != "Working") continue;
-      const int index = m->FindByCode(o.code.toStdString());
-      if (index < 0) continue;
-      const auto& q = m->QuoteOf(index);
-      if ((o.side == "Buy" && q.ask > 0 && q.ask <= o.price) || (o.side == "Sell" && q.bid > 0 && q.bid >= o.price))
-        o.status = "Filled";
-    }
+    m_bidLabel->setText({});
+    m_askLabel->setText({});
+    m_lastLabel->setText({});
   }
   FillBlotter();
 }
 
 void CTradeView::PlaceOrder() {
+  Blotter* blotter = CurrentBlotter();
   const auto* ins = InstrumentAt(m_instrument);
   if (!ins) { m_message->setText("Choose an instrument first."); return; }
+  if (!blotter) { m_message->setText("Orders cannot be placed in this terminal."); return; }
   if (ins->accessStatus != 3) { m_message->setText("This instrument cannot be traded."); return; }
   const qint64 qty = m_quantity->value();
   const qint64 lot = std::max<std::int64_t>(1, ins->lotSize);
@@ -202,9 +229,9 @@ void CTradeView::PlaceOrder() {
   const double touch = buy ? q.ask : q.bid;
   if (!market && m_price->value() <= 0) { m_message->setText("Enter a price."); return; }
   BlotterOrder o;
-  o.number = static_cast<int>(Blotter().size()) + 1;
   o.time = QString::fromStdString(MarketOrNull()->TimeText());
   o.side = buy ? "Buy" : "Sell";
+  o.productId = ins->productId;
   o.code = QString::fromStdString(ins->instrumentCode);
   o.quantity = qty;
   o.type = m_type->currentText();
@@ -213,22 +240,27 @@ void CTradeView::PlaceOrder() {
   const bool marketable = touch > 0 && (market || (buy ? m_price->value() >= touch : m_price->value() <= touch));
   o.price = marketable ? touch : m_price->value();
   o.status = marketable ? "Filled" : (m_validity->currentText() == "Fill and kill" ? "Cancelled" : "Working");
-  Blotter().push_back(o);
-  m_message->setText(QString("Order %1 %2.").arg(o.number).arg(o.status.toLower()));
+  const BlotterOrder& kept = blotter->Add(std::move(o));
+  QString text = QString("Order %1 %2.").arg(kept.number).arg(kept.status.toLower());
+  if (!blotter->LastError().empty())
+    text += QString(" It could not be saved: %1").arg(QString::fromStdString(blotter->LastError()));
+  m_message->setText(text);
   FillBlotter();
 }
 
 void CTradeView::FillBlotter() {
-  const auto& orders = Blotter();
+  const Blotter* blotter = CurrentBlotter();
+  if (!blotter || blotter->Version() == m_shownVersion) return;
+  m_shownVersion = blotter->Version();
+  const auto& orders = blotter->Orders();
   m_blotter->setRowCount(static_cast<int>(orders.size()));
   for (std::size_t i = 0; i < orders.size(); ++i) {
     const auto& o = orders[orders.size() - 1 - i];  // newest first
-    const int index = MarketOrNull() ? MarketOrNull()->FindByCode(o.code.toStdString()) : -1;
+    const int index = MarketOrNull() ? MarketOrNull()->Find(o.productId, o.code.toStdString()) : -1;
     SetRow(m_blotter, static_cast<int>(i),
            {QString::number(o.number), o.time, o.side, o.code, Grouped(o.quantity),
             index >= 0 ? Price(index, o.price) : QString::number(o.price), o.type, o.validity, o.status});
   }
-  m_shownOrders = orders.size();
 }
 
 // ---- Chart ------------------------------------------------------------------
@@ -240,29 +272,61 @@ void CChartView::Build() {
   chart->legend()->hide();
   m_series = new QLineSeries;
   chart->addSeries(m_series);
-  m_axisX = new QValueAxis;
-  m_axisX->setTitleText("minutes into the session");
-  m_axisX->setLabelFormat("%.0f");
+  m_axisX = new QDateTimeAxis;
+  m_axisX->setFormat("HH:mm");
+  m_axisX->setTickCount(7);
   m_axisY = new QValueAxis;
+  m_axisY->setTickType(QValueAxis::TicksDynamic);
   chart->addAxis(m_axisX, Qt::AlignBottom);
-  chart->addAxis(m_axisY, Qt::AlignLeft);
+  chart->addAxis(m_axisY, Qt::AlignRight);
   m_series->attachAxis(m_axisX);
   m_series->attachAxis(m_axisY);
   m_view = new QChartView(chart, this);
   m_view->setRenderHint(QPainter::Antialiasing);
-  m_empty = new QLabel("No instrument. Open the chart from a price view row.", this);
+  m_empty = new QLabel("No instrument. Drop one here from the explorer or a price view, or open the chart from a "
+                       "price view row.",
+                       this);
   m_empty->setAlignment(Qt::AlignCenter);
+  m_empty->setWordWrap(true);
   layout->addWidget(m_empty);
   layout->addWidget(m_view, 1);
 }
 
 int CChartView::pointCount() const { return m_series ? static_cast<int>(m_series->count()) : 0; }
 
+void CChartView::ChangeStyle(int styleId) {
+  CTerminalView::ChangeStyle(styleId);
+  if (!m_view || !m_pStyleManager) return;
+  const bool dark = styleId == 2;
+  QChart* chart = m_view->chart();
+  chart->setTheme(dark ? QChart::ChartThemeDark : QChart::ChartThemeLight);
+  chart->legend()->hide();
+  chart->setBackgroundBrush(m_pStyleManager->Color(hv::style::kWindowBackground));
+  chart->setTitleBrush(m_pStyleManager->Color(hv::style::kWindowText));
+  for (QAbstractAxis* axis : {static_cast<QAbstractAxis*>(m_axisX), static_cast<QAbstractAxis*>(m_axisY)}) {
+    axis->setLabelsColor(m_pStyleManager->Color(hv::style::kWindowText));
+    axis->setGridLineColor(m_pStyleManager->Color(104));
+  }
+  m_series->setColor(m_pStyleManager->Color(hv::style::kLinkText));
+  m_view->setBackgroundBrush(m_pStyleManager->Color(hv::style::kWindowBackground));
+}
+
 void CChartView::InstrumentChanged() {
   m_tradesShown = static_cast<std::size_t>(-1);
   m_empty->setVisible(m_instrument < 0);
   m_view->setVisible(m_instrument >= 0);
   m_view->chart()->setTitle(InstrumentLabel());
+}
+
+// A round step for about `ticks` price labels: 1, 2, 2.5 or 5 times a power of
+// ten, never finer than the instrument's own price step.
+static double NicePriceStep(double range, int ticks, double minStep) {
+  const double rough = std::max(range / std::max(1, ticks), 1e-9);
+  const double power = std::pow(10.0, std::floor(std::log10(rough)));
+  double step = power * 10;
+  for (double m : {1.0, 2.0, 2.5, 5.0})
+    if (power * m >= rough) { step = power * m; break; }
+  return std::max(step, minStep);
 }
 
 void CChartView::Refresh() {
@@ -272,31 +336,46 @@ void CChartView::Refresh() {
     return;
   }
   const auto& trades = m->Trades(m_instrument);
-  if (trades.size() == m_tradesShown) return;
+  // Times of day on the session's date, as the axis shows them.
+  const QDate day = QDate::fromString(QString::fromStdString(m->DateText()), Qt::ISODate);
+  const qint64 midnight = QDateTime(day, QTime(0, 0)).toMSecsSinceEpoch();
+  auto x = [&](std::uint32_t timeMs) { return static_cast<double>(midnight + timeMs); };
+  const double now = x(m->TimeOfDayMs());
+  if (trades.size() == m_tradesShown) {
+    // No trade since: the time axis still runs on to now.
+    if (m_series->count() > 0)
+      m_axisX->setMax(QDateTime::fromMSecsSinceEpoch(static_cast<qint64>(std::max(now, m_series->at(0).x() + 60000))));
+    return;
+  }
   m_tradesShown = trades.size();
-  const double start = m->Config().sessionStartSeconds * 1000.0;
   QList<QPointF> points;
-  double lo = 0, hi = 0;
   // At most ~800 points: every k-th trade, always the newest.
   const std::size_t step = std::max<std::size_t>(1, trades.size() / 800);
-  for (std::size_t i = 0; i < trades.size(); i += step) {
-    const auto& t = trades[i];
-    points.append(QPointF((t.timeMs - start) / 60000.0, t.price));
-  }
+  for (std::size_t i = 0; i < trades.size(); i += step) points.append(QPointF(x(trades[i].timeMs), trades[i].price));
   if (!trades.empty() && (trades.size() - 1) % step != 0)
-    points.append(QPointF((trades.back().timeMs - start) / 60000.0, trades.back().price));
+    points.append(QPointF(x(trades.back().timeMs), trades.back().price));
   if (points.isEmpty()) {
     const auto& q = m->QuoteOf(m_instrument);
-    if (q.close > 0) points.append(QPointF(0, q.close));
+    if (q.close > 0) points.append(QPointF(now, q.close));
   }
+  double lo = 0, hi = 0;
   for (const auto& p : points) {
     lo = lo == 0 ? p.y() : std::min(lo, p.y());
     hi = std::max(hi, p.y());
   }
   m_series->replace(points);
-  const double pad = std::max((hi - lo) * 0.05, hi * 0.001);
-  m_axisY->setRange(lo - pad, hi + pad);
-  m_axisX->setRange(0, std::max(1.0, points.isEmpty() ? 1.0 : points.back().x()));
+  const auto* ins = InstrumentAt(m_instrument);
+  const double tick = ins ? m->StepAt(ins->priceStepTableId, hi > 0 ? hi : 1.0) : 0.01;
+  const double priceStep = NicePriceStep(std::max(hi - lo, tick), 5, tick);
+  const double bottom = std::floor(lo / priceStep) * priceStep, top = std::ceil(hi / priceStep) * priceStep;
+  m_axisY->setRange(bottom, top > bottom ? top : bottom + priceStep);
+  m_axisY->setTickAnchor(bottom);
+  m_axisY->setTickInterval(priceStep);
+  const int decimals = std::clamp(static_cast<int>(std::ceil(-std::log10(priceStep) - 1e-9)), 0, 6);
+  m_axisY->setLabelFormat(QString("%.%1f").arg(decimals));
+  const double first = points.isEmpty() ? now - 60000 : points.front().x();
+  m_axisX->setRange(QDateTime::fromMSecsSinceEpoch(static_cast<qint64>(first)),
+                    QDateTime::fromMSecsSinceEpoch(static_cast<qint64>(std::max(now, first + 60000))));
 }
 
 // ---- Instrument explorer ----------------------------------------------------
@@ -304,7 +383,8 @@ void CChartView::Refresh() {
 void CExplorerView::Build() {
   auto* layout = new QVBoxLayout(this);
   m_search = new QLineEdit(this);
-  m_search->setPlaceholderText("Search code or name");
+  m_search->setObjectName("search");
+  m_search->setPlaceholderText("Search by code, symbol or name");
   m_search->setClearButtonEnabled(true);
   m_count = new QLabel(this);
   auto* top = new QHBoxLayout;
@@ -318,19 +398,18 @@ void CExplorerView::Build() {
   m_table->verticalHeader()->hide();
   m_table->setEditTriggers(QAbstractItemView::NoEditTriggers);
   m_table->setSelectionBehavior(QAbstractItemView::SelectRows);
-  m_table->horizontalHeader()->setStretchLastSection(true);
+  m_table->setWordWrap(false);
+  m_table->horizontalHeader()->setSectionResizeMode(QHeaderView::ResizeToContents);
+  m_table->horizontalHeader()->setSectionResizeMode(3, QHeaderView::Stretch);
   m_table->viewport()->installEventFilter(this);
   layout->addWidget(m_table, 1);
-  auto* hint = new QLabel("Drag instruments onto a watchlist of the price view; double-click to link them.", this);
+  auto* hint = new QLabel("Double-click an instrument to show it in the linked views. Drag instruments onto a "
+                          "watchlist of the price view, or one onto a chart, analytics or news.",
+                          this);
   hint->setWordWrap(true);
   layout->addWidget(hint);
   connect(m_search, &QLineEdit::textChanged, this, [this](const QString& t) { search(t); });
-  connect(m_table, &QTableView::doubleClicked, this, [this](const QModelIndex& index) {
-    if (!Runtime()) return;
-    bool ok = false;
-    const qint64 pid = m_model->item(index.row(), 0)->text().toLongLong(&ok);
-    if (ok) Runtime()->LinkInstrument(pid, m_model->item(index.row(), 1)->text().toStdString());
-  });
+  connect(m_table, &QTableView::doubleClicked, this, [this](const QModelIndex& index) { linkRow(index.row()); });
   search({});
 }
 
@@ -349,20 +428,38 @@ void CExplorerView::search(const QString& text) {
     const QString code = QString::fromStdString(ins.instrumentCode);
     const QString display = QString::fromStdString(ins.displayCode);
     const QString name = QString::fromStdString(ins.instrumentName);
+    const QString symbol = QString::fromStdString(ins.symbol);
     if (!needle.isEmpty() && !code.contains(needle, Qt::CaseInsensitive) &&
-        !display.contains(needle, Qt::CaseInsensitive) && !name.contains(needle, Qt::CaseInsensitive))
+        !display.contains(needle, Qt::CaseInsensitive) && !symbol.contains(needle, Qt::CaseInsensitive) &&
+        !name.contains(needle, Qt::CaseInsensitive))
       continue;
     if (++matches > kLimit) continue;
     QList<QStandardItem*> row;
     row << new QStandardItem(QString::number(ins.productId)) << new QStandardItem(code)
         << new QStandardItem(QString::fromStdString(ins.exchangeCode)) << new QStandardItem(name)
-        << new QStandardItem(QString::fromStdString(ins.productType));
+        << new QStandardItem(TypeName(ins.productType));
     m_model->appendRow(row);
   }
   m_count->setText(matches > kLimit ? QString("%1 of %2").arg(kLimit).arg(matches) : QString::number(matches));
 }
 
 int CExplorerView::resultCount() const { return m_model ? m_model->rowCount() : 0; }
+
+void CExplorerView::linkRow(int row) {
+  if (row < 0 || row >= m_model->rowCount()) return;
+  bool ok = false;
+  const qint64 pid = m_model->item(row, 0)->text().toLongLong(&ok);
+  if (ok) LinkInstrument(pid, m_model->item(row, 1)->text().toStdString(), this);
+}
+
+QString CExplorerView::TypeName(const std::string& productType) {
+  static const std::map<std::string, QString> names = {
+      {"ES", "Stock"}, {"IDX", "Index"}, {"FUT", "Future"}, {"FX", "Currency"},
+      {"CFD", "CFD"},  {"DMA", "DMA"},   {"CS", "Cash"},
+  };
+  const auto it = names.find(productType);
+  return it == names.end() ? QString::fromStdString(productType) : it->second;
+}
 
 bool CExplorerView::eventFilter(QObject* watched, QEvent* event) {
   if (watched == m_table->viewport()) {
@@ -394,8 +491,8 @@ void CExplorerView::StartDrag() {
   const QString link = QString("{\"type\":\"%1\",\"data\":[%2]}")
                            .arg(rows.size() > 1 ? "instrument view multiple" : "instrument view", objects.join(','));
   auto* mime = new QMimeData;
-  mime->setData("application/x-marketviews-link", link.toUtf8());
-  mime->setData("application/x-marketviews-source", QByteArray("CInsExpViewEx"));
+  mime->setData(hv::drag::kLinkMimeType, link.toUtf8());
+  mime->setData(hv::drag::kSourceMimeType, QByteArray("CInsExpViewEx"));
   mime->setText(link);
   auto* drag = new QDrag(this);
   drag->setMimeData(mime);
@@ -431,8 +528,8 @@ void CAnalyticsView::Refresh() {
       {"Instrument", QString::fromStdString(ins->displayCode.empty() ? ins->instrumentCode : ins->displayCode)},
       {"Name", QString::fromStdString(ins->instrumentName)},
       {"Exchange", QString::fromStdString(ins->exchangeCode)},
-      {"Product type", QString::fromStdString(ins->productType)},
-      {"Sector", QString::fromStdString(ins->sector)},
+      {"Product type", CExplorerView::TypeName(ins->productType)},
+      {"Sector", SectorName(*m, ins->sector)},
       {"Currency", QString::fromStdString(ins->currency)},
       {"Lot size", Grouped(ins->lotSize)},
       {"Last", Price(m_instrument, q.last)},

@@ -22,34 +22,36 @@ class QDateTimeAxis;
 
 namespace term::views {
 
-// One simulated order of the blotter, shared by every trade ticket.
-struct BlotterOrder {
-  int number = 0;
-  QString time, side, code, type, validity, trigger, status;
-  double price = 0;
-  qint64 quantity = 0;
-};
-std::vector<BlotterOrder>& Blotter();
-
-// Trade ticket: shows what the link carries and records simulated orders.
+// Trade ticket: shows what the link carries and records simulated orders in
+// the blotter (Blotter.h). The price stays the one the user clicked; the live
+// bid and ask beside it show how far the market has moved since.
 class CTradeView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "Trade ticket"; }
+  QString Caption() const override { return NameFor("CTradeView"); }
+  // Tests and scripts: the ticket's price and the live quote beside it.
+  Q_INVOKABLE double price() const;
+  Q_INVOKABLE QString side() const;
+  Q_INVOKABLE QString liveQuote() const;
+  Q_INVOKABLE void placeOrder() { PlaceOrder(); }
 
  protected:
   void Build() override;
   void Refresh() override;
   void TakeLink(const std::map<std::string, std::string>& link) override;
   void InstrumentChanged() override;
+  UINT RefreshInterval() const override { return 250; }
 
  private:
   void PlaceOrder();
   void FillBlotter();
   QLabel* m_instrumentLabel = nullptr;
-  QLabel* m_quoteLabel = nullptr;
+  QLabel* m_bidLabel = nullptr;
+  QLabel* m_askLabel = nullptr;
+  QLabel* m_lastLabel = nullptr;
   QComboBox* m_side = nullptr;
   QDoubleSpinBox* m_price = nullptr;
+  double m_linkPrice = 0;  // the price the link carried, set once the instrument's decimals are known
   QSpinBox* m_quantity = nullptr;
   QComboBox* m_type = nullptr;
   QComboBox* m_validity = nullptr;
@@ -57,18 +59,20 @@ class CTradeView : public CTerminalView {
   QLabel* m_message = nullptr;
   QPushButton* m_place = nullptr;
   QTableWidget* m_blotter = nullptr;
-  std::size_t m_shownOrders = 0;
+  std::uint64_t m_shownVersion = 0;
 };
 
 // Price chart of the instrument's traded prices in the session.
 class CChartView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "Chart"; }
+  QString Caption() const override { return NameFor("CBranticChartView"); }
   // Number of points drawn (tests).
   Q_INVOKABLE int pointCount() const;
+  void ChangeStyle(int styleId) override;
 
  protected:
+  bool TakesInstrumentDrops() const override { return true; }
   void Build() override;
   void Refresh() override;
   void InstrumentChanged() override;
@@ -76,22 +80,29 @@ class CChartView : public CTerminalView {
  private:
   QChartView* m_view = nullptr;
   QLineSeries* m_series = nullptr;
-  QValueAxis* m_axisX = nullptr;
-  QValueAxis* m_axisY = nullptr;
+  QDateTimeAxis* m_axisX = nullptr;  // time of day
+  QValueAxis* m_axisY = nullptr;     // price, in round steps
   QLabel* m_empty = nullptr;
   std::size_t m_tradesShown = 0;
 };
 
-// Instrument explorer: search by code or name, drag rows into a watchlist.
+// Instrument explorer: search by code, symbol or name; double-click shows an
+// instrument in the linked views; rows drag onto a watchlist, a chart,
+// analytics or news.
 class CExplorerView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "Instrument explorer"; }
+  QString Caption() const override { return NameFor("CInsExpViewEx"); }
   // Searches as if typed (tests and scripts).
   Q_INVOKABLE void search(const QString& text);
   Q_INVOKABLE int resultCount() const;
+  // What a double-click on result `row` does.
+  Q_INVOKABLE void linkRow(int row);
+  // What the Type column reads for a product type ("Index" for "IDX").
+  static QString TypeName(const std::string& productType);
 
  protected:
+  bool WatchesInstrument() const override { return false; }
   void Build() override;
   void Refresh() override {}
   UINT RefreshInterval() const override { return 0; }
@@ -110,9 +121,10 @@ class CExplorerView : public CTerminalView {
 class CAnalyticsView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "Stock analytics"; }
+  QString Caption() const override { return NameFor("CStockAnalytics"); }
 
  protected:
+  bool TakesInstrumentDrops() const override { return true; }
   void Build() override;
   void Refresh() override;
 
@@ -125,9 +137,10 @@ class CAnalyticsView : public CTerminalView {
 class CNewsView : public CTerminalView {
   Q_OBJECT
  public:
-  QString Caption() const override { return "News"; }
+  QString Caption() const override { return NameFor("CFNews"); }
 
  protected:
+  bool TakesInstrumentDrops() const override { return true; }
   void Build() override;
   void Refresh() override;
   void InstrumentChanged() override;

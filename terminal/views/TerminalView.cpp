@@ -8,6 +8,7 @@
 #include "hostview/StyleRoles.h"
 #include "hostview/Text.h"
 #include "terminal/host/HostRuntime.h"
+#include "terminal/host/Services.h"
 #include "terminal/sim/Market.h"
 #include "terminal/views/OwnViews.h"
 
@@ -15,6 +16,7 @@ namespace term::views {
 
 namespace {
 HostRuntime* g_runtime = nullptr;
+LinkHandler g_linkHandler;
 constexpr UINT kRefreshTimer = 1;
 
 template <typename T>
@@ -30,6 +32,10 @@ const CRuntimeClass kClasses[] = {
 }  // namespace
 
 void SetRuntime(HostRuntime* runtime) { g_runtime = runtime; }
+void SetLinkHandler(LinkHandler handler) { g_linkHandler = std::move(handler); }
+void LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from) {
+  if (g_linkHandler) g_linkHandler(productId, code, from);
+}
 HostRuntime* Runtime() { return g_runtime; }
 
 QStringList ClassNames() {
@@ -61,11 +67,17 @@ std::map<std::string, std::string> ParseLink(const std::wstring& text) {
 
 CTerminalView::CTerminalView() = default;
 
+CTerminalView::~CTerminalView() {
+  if (m_watched >= 0 && Runtime()) Runtime()->Market().RemoveInterest(m_watched);
+}
+
 int CTerminalView::OnCreate() {
   Build();
   // A restored view starts on the instrument of its start parameters.
-  if (Runtime() && GetStartProductId() >= 0 && !GetStartInstrumentCode().empty())
+  if (Runtime() && GetStartProductId() >= 0 && !GetStartInstrumentCode().empty()) {
     m_instrument = Runtime()->Market().Find(GetStartProductId(), GetStartInstrumentCode());
+    if (m_instrument >= 0 && WatchesInstrument()) Runtime()->Market().AddInterest(m_watched = m_instrument);
+  }
   ChangeStyle(GetStyleID());
   return 0;
 }
@@ -101,16 +113,7 @@ std::uint32_t CTerminalView::OnHostMessage(UINT message, LPARAM data) {
     }
     case hm::LinkedInstrument: {
       const auto* text = FromLParam<const std::wstring>(data);
-      if (!text || !Runtime()) return 0;
-      const auto fields = ParseLink(*text);
-      const auto pid = fields.find("Field_product_id");
-      const auto code = fields.find("Field_instrument_code");
-      if (pid == fields.end() || code == fields.end()) return 0;
-      try {
-        const int index = Runtime()->Market().Find(std::stoll(pid->second), code->second);
-        if (index >= 0) ShowInstrument(index);
-      } catch (const std::exception&) {
-      }
+      if (text) ShowLinked(*text);
       return 0;
     }
     default:
@@ -118,8 +121,37 @@ std::uint32_t CTerminalView::OnHostMessage(UINT message, LPARAM data) {
   }
 }
 
+bool CTerminalView::ShowLinked(const std::wstring& linkText) {
+  if (!Runtime()) return false;
+  const auto fields = ParseLink(linkText);
+  const auto pid = fields.find("Field_product_id");
+  const auto code = fields.find("Field_instrument_code");
+  if (pid == fields.end() || code == fields.end()) return false;
+  try {
+    const int index = Runtime()->Market().Find(std::stoll(pid->second), code->second);
+    if (index < 0) return false;
+    ShowInstrument(index);
+    return true;
+  } catch (const std::exception&) {
+    return false;
+  }
+}
+
+LRESULT CTerminalView::DoDragDrop(UINT message, LPARAM data) {
+  // A drop arrives as a ViewLink naming the source; the first instrument of its link counts.
+  const auto* link = message == hm::LinkData ? FromLParam<const ViewLink>(data) : nullptr;
+  if (!TakesInstrumentDrops() || !link || !link->link) return 0;
+  return ShowLinked(*link->link) ? 1 : 0;
+}
+
 void CTerminalView::ShowInstrument(int index) {
   m_instrument = index;
+  const int watch = WatchesInstrument() ? index : -1;
+  if (Runtime() && watch != m_watched) {
+    if (m_watched >= 0) Runtime()->Market().RemoveInterest(m_watched);
+    if (watch >= 0) Runtime()->Market().AddInterest(watch);
+    m_watched = watch;
+  }
   if (Runtime() && index >= 0) {
     const auto& ins = Runtime()->Market().Instruments()[static_cast<std::size_t>(index)];
     SetStartParam(ins.productId, ins.instrumentCode, GetStartParams());
@@ -141,6 +173,10 @@ void CTerminalView::ChangeStyle(int styleId) {
   pal.setColor(QPalette::Text, m_pStyleManager->Color(hv::style::kEditText));
   pal.setColor(QPalette::Button, m_pStyleManager->Color(hv::style::kButtonFace));
   pal.setColor(QPalette::ButtonText, m_pStyleManager->Color(hv::style::kButtonText));
+  pal.setColor(QPalette::PlaceholderText, m_pStyleManager->Color(hv::style::kMutedText));
+  pal.setColor(QPalette::AlternateBase, m_pStyleManager->Color(107));
+  pal.setColor(QPalette::Highlight, m_pStyleManager->Color(hv::style::kSelection));
+  pal.setColor(QPalette::HighlightedText, m_pStyleManager->Color(hv::style::kSelectionText));
   setPalette(pal);
   setAutoFillBackground(true);
   update();
@@ -150,6 +186,10 @@ void CTerminalView::ApplyLanguage() { SendTitle(); }
 
 void CTerminalView::OnTimer(UINT id) {
   if (id == kRefreshTimer) Refresh();
+}
+
+QString CTerminalView::NameFor(const char* className) const {
+  return QString::fromStdWString(ViewName(GetLanguage(), className));
 }
 
 QString CTerminalView::InstrumentLabel() const {

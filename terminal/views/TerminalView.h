@@ -6,6 +6,7 @@
 // restores them exactly like the add-on's views. They read the simulated market
 // through the host runtime.
 #include <QStringList>
+#include <functional>
 #include <cstdint>
 #include <map>
 #include <string>
@@ -31,6 +32,12 @@ const CRuntimeClass* FindClass(const std::string& className);
 // when the text is not a link text.
 std::map<std::string, std::string> ParseLink(const std::wstring& text);
 
+// Shows an instrument in the linked views (what a double-click in the
+// explorer does); set by the application, ignored while unset.
+using LinkHandler = std::function<void(std::int64_t productId, const std::string& code, CSuperBaseView* from)>;
+void SetLinkHandler(LinkHandler handler);
+void LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from);
+
 // Common behaviour: an instrument (from the start parameters or a 310 link),
 // a refresh timer on the platform clock, title through 101, colours from the
 // style manager.
@@ -38,11 +45,17 @@ class CTerminalView : public CSuperBaseView, public platform::TimerHandler {
   Q_OBJECT
  public:
   CTerminalView();
+  ~CTerminalView() override;
   std::uint32_t OnHostMessage(UINT message, LPARAM data) override;
   void ChangeStyle(int styleId) override;
   void ApplyLanguage() override;
   void OnTimer(UINT id) override;
   std::wstring GetTitle() override { return m_title; }
+  // Views that show one instrument take one dropped on them (from the
+  // explorer or a price-view row): see TakesInstrumentDrops().
+  bool EnableDropIn() override { return TakesInstrumentDrops(); }
+  bool EnableDropIn(const char*) override { return TakesInstrumentDrops(); }
+  LRESULT DoDragDrop(UINT message, LPARAM data) override;
 
   // The market index of the shown instrument, -1 when none.
   int Instrument() const { return m_instrument; }
@@ -62,10 +75,20 @@ class CTerminalView : public CSuperBaseView, public platform::TimerHandler {
   virtual void InstrumentChanged() {}
   // Milliseconds between refreshes; 0 for none.
   virtual UINT RefreshInterval() const { return 1000; }
+  // Whether an instrument dropped on the view (or linked to it) replaces its own.
+  virtual bool TakesInstrumentDrops() const { return false; }
+  // Whether the view shows the live market of its instrument (it then counts
+  // as watching it, so the market moves it at the watched pace).
+  virtual bool WatchesInstrument() const { return true; }
+  // Shows the instrument a link text names; false when it names none the market knows.
+  bool ShowLinked(const std::wstring& linkText);
   void SendTitle();
   QString InstrumentLabel() const;
+  // The class's name for a person, from the language table.
+  QString NameFor(const char* className) const;
 
   int m_instrument = -1;
+  int m_watched = -1;  // the instrument whose market this view keeps moving (interest)
   std::wstring m_title;
   bool m_started = false;
 };

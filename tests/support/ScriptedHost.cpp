@@ -5,7 +5,9 @@
 
 #include <QApplication>
 #include <algorithm>
+#include <cstdio>
 #include <cstdlib>
+#include <filesystem>
 #include <type_traits>
 
 namespace mvtest {
@@ -44,10 +46,23 @@ FakeLogFactory& SharedLogFactory() {
 
 // ---- AddonLibrary ------------------------------------------------------------
 
-AddonLibrary& AddonLibrary::Get() {
-  static AddonLibrary library;
-  return library;
+namespace {
+bool& FreshCopyWanted() {
+  static bool wanted = false;
+  return wanted;
 }
+}  // namespace
+
+AddonLibrary& AddonLibrary::Get() {
+  static std::vector<std::unique_ptr<AddonLibrary>> copies;  // never unloaded
+  if (copies.empty() || FreshCopyWanted()) {
+    copies.push_back(std::unique_ptr<AddonLibrary>(new AddonLibrary(int(copies.size()))));
+    FreshCopyWanted() = false;
+  }
+  return *copies.back();
+}
+
+void AddonLibrary::StartFresh() { FreshCopyWanted() = true; }
 
 // MV_ADDON, else lib/libmarketviews.so next to the test's folder (<build>/tests/..).
 static std::string AddonPath() {
@@ -60,15 +75,34 @@ static std::string AddonPath() {
   return dir + "/../lib/libmarketviews.so";
 }
 
-AddonLibrary::AddonLibrary() {
+// A copy of `path` in the temporary folder; empty on failure.
+static std::string CopyOf(const std::string& path, int copy) {
+  std::error_code ec;
+  const std::filesystem::path dir = std::filesystem::temp_directory_path(ec);
+  if (ec) return {};
+  const std::string to =
+      (dir / ("mvtest-addon-" + std::to_string(getpid()) + "-" + std::to_string(copy) + ".so")).string();
+  if (!std::filesystem::copy_file(path, to, std::filesystem::copy_options::overwrite_existing, ec)) return {};
+  return to;
+}
+
+AddonLibrary::AddonLibrary(int copy) {
   m_path = AddonPath();
   if (m_path.empty()) {
     m_error = "MV_ADDON is not set and the test's own path is unknown";
     return;
   }
-  const char* path = m_path.c_str();
+  // The first copy is the file itself; later ones are copies of it, removed
+  // once loaded.
+  const std::string file = copy == 0 ? m_path : CopyOf(m_path, copy);
+  if (file.empty()) {
+    m_error = "cannot copy " + m_path + " to the temporary folder";
+    return;
+  }
+  const char* path = file.c_str();
   // As the terminal loads it: resolve everything now, keep the symbols private.
   void* handle = dlopen(path, RTLD_NOW | RTLD_LOCAL);
+  if (copy != 0) std::remove(path);
   if (!handle) {
     const char* err = dlerror();
     m_error = err ? err : "dlopen failed";
@@ -85,7 +119,9 @@ const CRuntimeClass* AddonLibrary::Find(const char* className) const {
 // ---- ScriptedHost ------------------------------------------------------------
 
 ScriptedHost::ScriptedHost()
-    : logs(SharedLogFactory()), clock((EnsureApplication(), platform::UseVirtualClock())), dialogs(InstallDialogs()) {}
+    : logs(SharedLogFactory()), clock((EnsureApplication(), platform::UseVirtualClock())), dialogs(InstallDialogs()) {
+  AddonLibrary::StartFresh();
+}
 
 ScriptedHost::~ScriptedHost() {
   while (!m_views.empty()) Destroy(m_views.back());

@@ -69,8 +69,7 @@ class CInstrumentGrid : public CGridCtrl {
   // Row background: odd rows (1, 3, ...) take 106, even rows 107.
   QColor RowBackColor(int row) const { return (row % 2) ? m_oddRow : m_evenRow; }
 
-  // The headings and every row as the user sees them, tab-separated (see the
-  // grid dump convention of the terminal).
+  // The text over the empty grid, for the terminal's dump (read by name).
   Q_INVOKABLE QString messageText() const { return QString::fromStdWString(m_message); }
 
  protected:

@@ -14,15 +14,8 @@
 ADDON_IMPLEMENT_VIEW(CMarketDepthAdv)
 
 const addon::ViewClassInfo& CMarketDepthAdv::Info() {
-  static const addon::ViewClassInfo info{
-      .className = "CMarketDepthAdv",
-      .titleEntry = 7,
-      .defaultTitle = L"Market Depth",
-      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
-      .refusalKey = "17001",
-      .dropSources = addon::kInstrumentViewSources,
-      .descriptor = &classCMarketDepthAdv,
-  };
+  static const addon::ViewClassInfo info =
+      InstrumentClassInfo("CMarketDepthAdv", &classCMarketDepthAdv, 7, L"Market Depth", "17001");
   return info;
 }
 

@@ -1,6 +1,5 @@
 #include "views/instrument/SingleInstrumentView.h"
 
-#include <QKeyEvent>
 #include <QLineEdit>
 #include <QPainter>
 #include <algorithm>
@@ -22,19 +21,25 @@ constexpr int kSecondButtonId = 2016;
 constexpr int kButtonSize = 18;
 constexpr COLORREF kButtonBack = MakeColorRef(0xCC, 0xCC, 0xCC);
 
-std::wstring ReplaceStyleId(std::wstring path, int styleId) {
-  static const std::wstring kPlaceholder = L"[styleID]";
-  const std::wstring id = std::to_wstring(styleId);
-  for (std::size_t at = path.find(kPlaceholder); at != std::wstring::npos; at = path.find(kPlaceholder, at + id.size()))
-    path.replace(at, kPlaceholder.size(), id);
-  return path;
-}
-
 }  // namespace
 
 CSingleInstrumentView::CSingleInstrumentView(const addon::ViewClassInfo& info) : CAddonView(info) {}
 
 CSingleInstrumentView::~CSingleInstrumentView() = default;
+
+addon::ViewClassInfo CSingleInstrumentView::InstrumentClassInfo(const char* className,
+                                                                const CRuntimeClass* descriptor, int titleEntry,
+                                                                const wchar_t* defaultTitle, const char* refusalKey) {
+  return addon::ViewClassInfo{
+      .className = className,
+      .titleEntry = titleEntry,
+      .defaultTitle = defaultTitle,
+      .firstStores = {addon::RefStore::Products, addon::RefStore::Instruments},
+      .refusalKey = refusalKey,
+      .dropSources = addon::kInstrumentViewSources,
+      .descriptor = descriptor,
+  };
+}
 
 bool CSingleInstrumentView::IsCurrentRegistration() const {
   if (!m_user.IsMember()) return false;
@@ -117,7 +122,7 @@ void CSingleInstrumentView::OnComboChosen() {
 }
 
 void CSingleInstrumentView::ReloadImages() {
-  const std::wstring path = ReplaceStyleId(kExplorerImage, m_styleId);
+  const std::wstring path = StyleImagePath(kExplorerImage);
   if (m_explorer) m_explorer->LoadBitmap(path);
 }
 
@@ -525,8 +530,12 @@ void CSingleInstrumentView::Relayout() {
   }
   if (m_second) m_second->hide();
   if (header) top += kHeaderHeight;
-  if (m_grid) m_grid->setGeometry(0, top, w, std::max(0, h - top));
+  LayoutBody(QRect(0, top, w, std::max(0, h - top)));
   update();
+}
+
+void CSingleInstrumentView::LayoutBody(const QRect& area) {
+  if (m_grid) m_grid->setGeometry(area);
 }
 
 void CSingleInstrumentView::resizeEvent(QResizeEvent* e) {

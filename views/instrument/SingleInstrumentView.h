@@ -38,7 +38,9 @@
 //   EmptyStateText()          the grid's text while an instrument has no rows;
 //   StartTimers(activation)   timers on host code 2 (true) and 1 (false);
 //   column-mask hooks         only the depth view keeps a column mask in its
-//                             start parameters.
+//                             start parameters;
+//   LayoutBody(area)          the area below the header: all of it for the grid
+//                             by default (the trade summary adds its chart).
 // The class-specific data (title entry 7, 8, 10; refusal key "17001",
 // "17002", "17003"; the drop sources) come from addon::ViewClassInfo.
 //
@@ -78,6 +80,13 @@ class CSingleInstrumentView : public CAddonView {
 
   explicit CSingleInstrumentView(const addon::ViewClassInfo& info);
   ~CSingleInstrumentView() override;
+
+  // The class data every single-instrument view shares: products and
+  // instruments asked for first, the instrument views as drop sources; the
+  // title entry, default title and exchange refusal key are the class's own.
+  static addon::ViewClassInfo InstrumentClassInfo(const char* className, const CRuntimeClass* descriptor,
+                                                  int titleEntry, const wchar_t* defaultTitle,
+                                                  const char* refusalKey);
 
   // ---- Registration ----
   // Handed out by the user registry at creation, returned at destruction.
@@ -175,6 +184,9 @@ class CSingleInstrumentView : public CAddonView {
   virtual void RestoreColumnMask(const std::wstring& mask) {}
   // The view's own data notifications (410/412, 2600, ...).
   virtual std::uint32_t OnInstrumentViewMessage(UINT message, LPARAM data) { return 0; }
+  // Places what lies below the header (the grid, and what a view draws above
+  // it) in `area`. Default: the grid takes all of it.
+  virtual void LayoutBody(const QRect& area);
 
   // True while the instrument of a 310 (start parameters) is being selected.
   bool SelectingFromStartParams() const { return m_fromStartParams; }

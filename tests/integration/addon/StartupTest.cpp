@@ -63,11 +63,11 @@ TEST(PrepareBasicData_FirstActivation, EachClassHasItsOwnFirstTimeFlag) {
   host.ClearRequests();
   host.Open("CNewPriceAlertAdv");
   EXPECT_EQ(Summary(host.Requests()),
-            (std::vector<std::string>{"515 ALEML", "515 ALSMS", "515 MAXPA", "505", "500"}));
+            (std::vector<std::string>{"515 ALEML", "515 ALSMS", "515 MAXPA", "505", "500", "2301", "101 title"}));
 
   host.ClearRequests();
   host.Open("CPriceAlertList");
-  EXPECT_EQ(Summary(host.Requests()), (std::vector<std::string>{"102 370x250", "505", "500", "101 title"}));
+  EXPECT_EQ(Summary(host.Requests()), (std::vector<std::string>{"102 370x250", "505", "500", "101 title", "701"}));
 }
 
 TEST(PrepareBasicData_FirstActivation, DeactivationAlsoPreparesData) {

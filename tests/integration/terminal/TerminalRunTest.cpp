@@ -7,6 +7,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -14,6 +15,7 @@
 #include <set>
 #include <sstream>
 
+#include "terminal/sim/Market.h"
 #include "terminal/store/Store.h"
 
 namespace fs = std::filesystem;
@@ -117,6 +119,9 @@ TEST(TerminalRefusal, MissingAddonIsNamedAndRefused) {
   EXPECT_EQ(Lines(r.err).size(), 1u) << r.err;
   EXPECT_TRUE(r.out.empty());
   EXPECT_FALSE(fs::exists(dir.path / "terminal.db")) << "a refused start touches no data";
+  EXPECT_NE(ReadFile(dir.path / "logs" / "terminal.log").find("cannot load the add-on /nowhere/libmarketviews.so"),
+            std::string::npos)
+      << "and says why in the log";
 }
 
 TEST(TerminalRefusal, LibraryWithoutEntryPointIsRefused) {
@@ -142,6 +147,19 @@ TEST(TerminalRefusal, UnknownClassAndBadOptionsAreRefused) {
   r = RunTerminal({"--open", "CMarketDepthAdv:x:D05"});
   EXPECT_EQ(r.exitCode, 2);
   EXPECT_NE(r.err.find("product id"), std::string::npos) << r.err;
+}
+
+TEST(TerminalRefusal, UnknownInstrumentInOpenEndsAHeadlessRunWithTwo) {
+  TempDir dir;
+  const RunResult r = RunTerminal(With(kSmallMarket, {"--data-dir", dir.path.string(), "--seconds", "1", "--open",
+                                                      "CMarketDepthAdv:101:NOSUCH", "--snapshot",
+                                                      (dir.path / "shots").string()}));
+  EXPECT_EQ(r.exitCode, 2) << r.err;
+  EXPECT_NE(r.err.find("unknown instrument 101:NOSUCH"), std::string::npos) << r.err;
+  EXPECT_NE(r.err.find("--list-instruments"), std::string::npos) << "the message says where to look: " << r.err;
+  EXPECT_EQ(r.err.find("running"), std::string::npos) << "nothing ran: " << r.err;
+  EXPECT_FALSE(fs::exists(dir.path / "shots"));
+  EXPECT_NE(ReadFile(dir.path / "logs" / "terminal.log").find("unknown instrument 101:NOSUCH"), std::string::npos);
 }
 
 TEST(TerminalList, ListInstrumentsPrintsTabSeparatedRowsDeterministically) {
@@ -237,6 +255,51 @@ TEST(TerminalHeadless, CorruptDatabaseIsSetAsideAndReported) {
   for (const auto& name : FileNames(dir.path))
     if (name.rfind("terminal.db.corrupt-", 0) == 0 && ReadFile(dir.path / name) == garbage) ++kept;
   EXPECT_EQ(kept, 1);
+  EXPECT_NE(ReadFile(dir.path / "logs" / "terminal.log").find("cannot be read"), std::string::npos)
+      << "the log says it too";
+}
+
+// The very first start: the price view, and depth and trades of the busiest
+// stock (not an index, which has no book).
+TEST(TerminalHeadless, FirstStartShowsTheDepthAndTradesOfALiquidStock) {
+  TempDir dir;
+  const RunResult r = RunTerminal(With(kSmallMarket, {"--data-dir", dir.path.string(), "--seconds", "2", "--dump",
+                                                      (dir.path / "dump").string()}));
+  ASSERT_EQ(r.exitCode, 0) << r.err;
+  sim::MarketConfig config;
+  config.seed = 7;
+  config.instruments = 200;
+  sim::Market market(config);
+  const auto& stock = market.Instruments().at(static_cast<std::size_t>(market.LiquidStock()));
+  ASSERT_EQ(stock.productType, "ES");
+  term::StoreOpenReport report;
+  std::string error;
+  auto store = term::Store::Open(dir.path, report, error);
+  ASSERT_TRUE(store) << error;
+  int onStock = 0;
+  for (const auto& v : store->LoadLayout().views) {
+    if (v.className != "CMarketDepthAdv" && v.className != "CTimeAndSalesAdv") continue;
+    EXPECT_EQ(v.productId, stock.productId) << v.className;
+    EXPECT_EQ(v.instrumentCode, stock.instrumentCode) << v.className;
+    ++onStock;
+  }
+  EXPECT_EQ(onStock, 2);
+  // The depth grid has a book: a bid below an ask on the first line.
+  const auto depth = Lines(ReadFile(dir.path / "dump" / "CMarketDepthAdv-1.tsv"));
+  ASSERT_GE(depth.size(), 3u);
+  auto cells = [](const std::string& line) {
+    std::vector<std::string> out;
+    std::istringstream in(line);
+    for (std::string cell; std::getline(in, cell, '\t');) out.push_back(cell);
+    return out;
+  };
+  const auto heads = cells(depth[0]), first = cells(depth[1]);
+  const auto bidAt = std::find(heads.begin(), heads.end(), "Bid") - heads.begin();
+  const auto askAt = std::find(heads.begin(), heads.end(), "Ask") - heads.begin();
+  ASSERT_LT(std::size_t(std::max(bidAt, askAt)), first.size()) << depth[0] << "\n" << depth[1];
+  const double bid = std::stod(first[std::size_t(bidAt)]), ask = std::stod(first[std::size_t(askAt)]);
+  EXPECT_GT(bid, 0);
+  EXPECT_LT(bid, ask);
 }
 
 // Killed with SIGTERM in the middle of a long run: the terminal stops, saves its

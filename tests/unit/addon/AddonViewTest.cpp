@@ -5,8 +5,13 @@
 #include <algorithm>
 
 #include "addon/AddonView.h"
+#include "addon/Logging.h"
+#include "data/MarketDelayCache.h"
+#include "data/ReferenceStores.h"
+#include "hostview/HostLists.h"
 #include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
+#include "mvtest/ProcessStateReset.h"
 #include "mvtest/ScriptedHost.h"
 
 namespace {
@@ -35,6 +40,7 @@ class CTestView : public CAddonView {
 };
 
 struct AddonViewTest : ::testing::Test {
+  void SetUp() override { CAddonView::ResetProcessState(); }
   mvtest::ScriptedHost host;
   CTestView* Make() { return static_cast<CTestView*>(host.Adopt(new CTestView)); }
 };
@@ -191,6 +197,93 @@ TEST_F(AddonViewTest, Mend_NullPointersAndUnknownNumbersChangeNothing) {
   EXPECT_TRUE(host.Requests().empty());
   EXPECT_TRUE(view->LinkMode());
   EXPECT_TRUE(view->LastMessageText().empty());
+}
+
+TEST_F(AddonViewTest, Ask_ReturnsTheAnswerDeliveredInsideTheRequestOrNone) {
+  CTestView* view = Make();
+  // No answer.
+  EXPECT_FALSE(view->Ask<LPARAM>(hm::ExchangeEnabled, 0));
+  // A number, taken by the question only: the view's own handler never sees it.
+  host.AnswerValue(hm::ExchangeEnabled, 0);
+  EXPECT_EQ(view->Ask<LPARAM>(hm::ExchangeEnabled, 0), std::optional<LPARAM>(0));
+  EXPECT_TRUE(view->seen.empty());
+  // A record, copied; a null word is no answer ("no such instrument").
+  JInstrumentUnderlying found;
+  found.instrumentCode = "D05";
+  const JInstrumentUnderlying* answer = &found;
+  host.AnswerWith(hm::FindByCode, [&](const mvtest::Feedback&) { return std::optional<LPARAM>(ToLParam(answer)); });
+  const auto record = view->Ask<JInstrumentUnderlying>(hm::FindByCode, 0);
+  ASSERT_TRUE(record);
+  EXPECT_EQ(record->instrumentCode, "D05");
+  answer = nullptr;
+  EXPECT_FALSE(view->Ask<JInstrumentUnderlying>(hm::FindByCode, 0));
+  // Another number that answers, the last of several answers counts.
+  host.AnswerWith(hm::DisplayMode, [&](const mvtest::Feedback& f) {
+    f.view->OnHostMessage(hm::AltStatus, 1);
+    return std::optional<LPARAM>(2);
+  });
+  EXPECT_EQ(view->Ask<LPARAM>(hm::DisplayMode, 1, {hm::AltStatus, hm::DisplayMode}), std::optional<LPARAM>(2));
+  EXPECT_EQ(view->DisplayModeValue(), 0);  // taken by the question, not filed
+  EXPECT_TRUE(view->seen.empty());
+}
+
+TEST_F(AddonViewTest, Ask_NestedQuestionsEachTakeTheirOwnAnswer) {
+  CTestView* view = Make();
+  host.AnswerValue(hm::AltStatus, 2);
+  std::optional<LPARAM> inner;
+  host.AnswerWith(hm::ExchangeEnabled, [&](const mvtest::Feedback&) {
+    inner = view->Ask<LPARAM>(hm::AltStatus, 0);  // asked while the outer one waits
+    return std::optional<LPARAM>(1);
+  });
+  EXPECT_EQ(view->Ask<LPARAM>(hm::ExchangeEnabled, 0), std::optional<LPARAM>(1));
+  EXPECT_EQ(inner, std::optional<LPARAM>(2));
+  // Outside any question the same answer is a notification again.
+  host.Send(view, hm::AltStatus, 2);
+  EXPECT_TRUE(view->UsesAltStatus());
+}
+
+TEST_F(AddonViewTest, Lists_EveryViewFilesExchangesAndMarketDelays) {
+  CTestView* view = Make();
+  std::vector<JExchangeList> exchanges(2);
+  exchanges[0].exchangeCode = "SGX";
+  exchanges[0].exchangeName = "Singapore";
+  exchanges[1].exchangeCode = "HKEX";
+  JExchangeListMsg list{2, 0, &exchanges};
+  host.Send(view, hm::ExchangeList, ToLParam(&list));
+  ASSERT_NE(ExchangeMgr().FindPtr("SGX"), nullptr);
+  EXPECT_EQ(ExchangeMgr().FindPtr("SGX")->exchangeName, "Singapore");
+  EXPECT_TRUE(addon::IsStoreLoaded(addon::RefStore::Exchanges));
+
+  std::vector<JMarketInfo> info(2);
+  info[0].productId = 1;
+  info[0].exchangeCode = "SGX";
+  info[0].delay = 15;
+  info[1].productId = 1;
+  info[1].exchangeCode = "HKEX";
+  info[1].delay = 30;
+  host.Send(view, hm::MarketInfo, ToLParam(&info));
+  EXPECT_EQ(MarketDelayCache::Instance().Lookup(1, L"SGX"), L"15");
+  std::wstring text;
+  EXPECT_FALSE(MarketDelayCache::Instance().Find(1, L"HKEX", text));  // only the row asked for
+  const std::vector<JMarketInfo> none;
+  host.Send(view, hm::MarketInfo, ToLParam(&none));  // an unknown exchange: nothing
+  // The view still hears of both.
+  EXPECT_EQ(view->seen, (std::vector<UINT>{hm::ExchangeList, hm::MarketInfo, hm::MarketInfo}));
+  MarketDelayCache::Instance().Clear();
+}
+
+TEST_F(AddonViewTest, PrepareBasicData_ClassWithoutANameLogsUnderTheUnknownName) {
+  static const addon::ViewClassInfo unnamed{.className = nullptr};
+  struct CUnnamedView : CAddonView {
+    CUnnamedView() : CAddonView(unnamed) {}
+  };
+  auto* view = static_cast<CUnnamedView*>(host.Adopt(new CUnnamedView));
+  host.Send(view, hm::Activate);
+  EXPECT_TRUE(view->IsActive());
+  ASSERT_EQ(host.logs.Texts().size(), 2u);
+  EXPECT_EQ(host.logs.Texts()[0].rfind("Info:::PrepareBasicData file:AddonView.cpp line:", 0), 0u)
+      << host.logs.Texts()[0];
+  EXPECT_NE(addon::FindLogger(L"PriceViewUnknow"), nullptr);
 }
 
 }  // namespace

@@ -74,6 +74,9 @@ TEST_F(DepthStoreTest, Update_EmptyValueBlanksPriceAndMarksChanged) {
   r = store_.Get(k, 90);
   EXPECT_EQ(r[DepthLayout::Buy].text, L"11.00");
   EXPECT_EQ(r[DepthLayout::Buy].mark, kMarkNone);
+  // Blanks only are an empty value too.
+  EXPECT_TRUE(store_.Update(k, L"BUY", L" ", 92));
+  EXPECT_EQ(store_.Get(k, 92)[DepthLayout::Buy].text, L"");
   // Non-finite text is not an empty value: nothing happens.
   store_.ClearChanged();
   EXPECT_FALSE(store_.Update(k, L"BUY", L"nan", 95));
@@ -130,6 +133,9 @@ TEST(SummaryLineStore_Formats, ThreeDecimalsAndPriceMarks) {
   const auto r = s.Get(k, 2);
   EXPECT_EQ(r[SummaryLineLayout::Vol].text, L"900.000");
   EXPECT_EQ(r[SummaryLineLayout::Vol].mark, kMarkDown);
+  // A withdrawn value reads as 0.
+  EXPECT_TRUE(s.Update(k, L"VOL", L"", 3));
+  EXPECT_EQ(s.Get(k, 3)[SummaryLineLayout::Vol].text, L"0.000");
 }
 
 TEST(SalesPageStore_Recount, OneLockScanSeesFilledPagesAndNewestVersion) {

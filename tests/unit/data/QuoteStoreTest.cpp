@@ -7,6 +7,7 @@
 #include "data/QuoteStore.h"
 #include "data/ReferenceStores.h"
 #include "hostview/Text.h"
+#include "mvtest/ProcessStateReset.h"
 
 namespace {
 
@@ -163,7 +164,7 @@ TEST_F(QuoteStoreTest, Update_NonFiniteValueKeepsPreviousValueAndText) {
   store_.Update(kB, L"LAST", L"11", 2);
   store_.ClearChanged();
   const auto v = store_.Version();
-  for (const wchar_t* bad : {L"nan", L"inf", L"-inf", L"1e999", L"garbage", L"", L"12..5"}) {
+  for (const wchar_t* bad : {L"nan", L"inf", L"-inf", L"1e999", L"garbage", L"12..5", L"1 2"}) {
     EXPECT_FALSE(store_.Update(kB, L"LAST", bad, 3)) << hv::Narrow(bad);
   }
   const QuoteRecord r = store_.Get(kB, 4);
@@ -173,6 +174,41 @@ TEST_F(QuoteStoreTest, Update_NonFiniteValueKeepsPreviousValueAndText) {
   EXPECT_EQ(r[Q::Last].changedAt, 2u);
   EXPECT_FALSE(r.changed);
   EXPECT_EQ(store_.Version(), v);
+}
+
+// The terminal withdraws a price with an empty text: it reads as 0, and the
+// price coming back is a rise from there.
+TEST_F(QuoteStoreTest, Update_WithdrawnBidReadsAsZeroAndComesBack) {
+  store_.Get(kA, 0);
+  store_.Update(kA, L"BID", L"10.5", 1);
+  store_.Update(kA, L"BVOL", L"300", 1);
+  store_.ClearChanged();
+  ASSERT_TRUE(store_.Update(kA, L"BID", L"", 2));
+  QuoteRecord r = store_.Get(kA, 2);
+  EXPECT_EQ(r[Q::Bid].text, L"0.00");
+  EXPECT_DOUBLE_EQ(r[Q::Bid].value, 0);
+  EXPECT_EQ(r[Q::Bid].mark, kMarkDown);
+  EXPECT_EQ(r[Q::Bid].changedAt, 2u);
+  EXPECT_TRUE(r.changed);
+  EXPECT_EQ(r[Q::BVol].text, L"300.00") << "only the withdrawn field moves";
+
+  // Withdrawn again (blanks only): nothing moved, no mark.
+  store_.ExpireMarks(2000);
+  EXPECT_TRUE(store_.Update(kA, L"BID", L" ", 2100));
+  EXPECT_EQ(store_.Get(kA, 2100)[Q::Bid].mark, kMarkNone);
+
+  ASSERT_TRUE(store_.Update(kA, L"BID", L"10.4", 2200));
+  r = store_.Get(kA, 2200);
+  EXPECT_EQ(r[Q::Bid].text, L"10.40");
+  EXPECT_EQ(r[Q::Bid].mark, kMarkUp);
+
+  // Volumes and percentages read the same way.
+  store_.Update(kA, L"BVOL", L"", 2300);
+  store_.Update(kA, L"PCHANGE", L"", 2300);
+  r = store_.Get(kA, 2300);
+  EXPECT_EQ(r[Q::BVol].text, L"0.00");
+  EXPECT_EQ(r[Q::BVol].mark, kMarkChanged);
+  EXPECT_EQ(r[Q::PChange].text, L"0.000");
 }
 
 TEST_F(QuoteStoreTest, TakePending_WithLimitOrSet) {

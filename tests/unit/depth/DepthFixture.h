@@ -10,10 +10,12 @@
 #include <string>
 #include <vector>
 
+#include "addon/Feeds.h"
 #include "addon/LinkText.h"
 #include "data/MarketStores.h"
 #include "hostconfig/UserSettings.h"
 #include "hostview/HostLists.h"
+#include "mvtest/ProcessStateReset.h"
 #include "mvtest/ScriptedHost.h"
 #include "views/instrument/DepthGrid.h"
 #include "views/instrument/MarketDepthAdv.h"
@@ -51,6 +53,8 @@ struct DepthFixture : ::testing::Test {
   std::uint32_t pushes = 0;
 
   void SetUp() override {
+    CAddonView::ResetProcessState();
+    addon::DepthFeed::Instance().Reset();
     host.AnswerValue(hm::ExchangeEnabled, 1);
     host.AnswerText("17005", L"No depth yet");
     host.style.colors[3103] = MakeColorRef(1, 2, 3);

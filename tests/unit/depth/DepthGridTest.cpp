@@ -45,6 +45,7 @@ struct DepthGridTest : ::testing::Test {
   const InstrumentKey key{7, L"D05"};
 
   void SetUp() override {
+    addon::DepthFeed::Instance().Reset();
     parent.resize(500, 400);
     grid = new TestGrid(&parent);
     grid->resize(400, 300);
@@ -99,8 +100,28 @@ TEST_F(DepthGridTest, Headings_FromTheLanguageTable) {
   language.Set(13, 505, L"Ask Qty");
   grid->ApplyLanguage(&language);
   EXPECT_EQ(grid->dumpTsv(), "Bid Qty\tBuy\tSell\tAsk Qty\n");
-  QString hint;
   EXPECT_EQ(grid->HeadingText(DepthGrid::kBVol), L"Bid Qty");
+  // The hint over a heading is the heading's text.
+  QString hint;
+  ASSERT_TRUE(grid->HintAt(grid->CellRect(0, -1).center(), &hint));
+  EXPECT_EQ(hint, QStringLiteral("Bid Qty"));
+  ASSERT_TRUE(grid->HintAt(grid->CellRect(3, -1).center(), &hint));
+  EXPECT_EQ(hint, QStringLiteral("Ask Qty"));
+
+  // Every column reads its own entry (501 to 506); entries the table lacks
+  // and a missing table give the built-in headings.
+  grid->SetColumnMask(L"111111");
+  language.Set(13, 501, L"Bid Orders");
+  language.Set(13, 503, L"Bid");
+  language.Set(13, 504, L"Ask");
+  language.Set(13, 506, L"Ask Orders");
+  grid->ApplyLanguage(&language);
+  EXPECT_EQ(grid->dumpTsv(), "Bid Orders\tBid Qty\tBid\tAsk\tAsk Qty\tAsk Orders\n");
+  language.Set(13, 503, L"");
+  grid->ApplyLanguage(&language);
+  EXPECT_EQ(grid->dumpTsv(), "Bid Orders\tBid Qty\tBuy\tAsk\tAsk Qty\tAsk Orders\n");
+  grid->ApplyLanguage(nullptr);
+  EXPECT_EQ(grid->dumpTsv(), "Buy Orders\tBuy Vol\tBuy\tSell\tSell Vol\tSell Orders\n");
 }
 
 TEST_F(DepthGridTest, Cells_VolumesGroupedZeroEmptyPricesAsStored) {

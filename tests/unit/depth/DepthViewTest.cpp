@@ -6,6 +6,7 @@
 
 #include "controls/InstrumentComboBox.h"
 #include "hostview/Buttons.h"
+#include "hostview/Text.h"
 #include "views/instrument/TimeAndSalesAdv.h"
 
 namespace depthtest {
@@ -277,6 +278,8 @@ TEST_F(DepthView, ColumnMask_SavedWithTheStartParametersAndRestored) {
 }
 
 TEST_F(DepthView, AccessStatus_NotViewableNotTradeableAndBoth) {
+  // The refusals are the view's own texts: a terminal text for the message
+  // code 17007 does not replace them, and is not even asked for.
   host.AnswerText("17007, 0", L"not from here");
   CMarketDepthAdv* view = Make();
 
@@ -287,6 +290,7 @@ TEST_F(DepthView, AccessStatus_NotViewableNotTradeableAndBoth) {
   EXPECT_EQ(view->CurrentInstrument(), nullptr);
   host.Advance(400);
   EXPECT_TRUE(FieldRequests().empty());
+  EXPECT_TRUE(host.RequestsOf(hm::MessageText).empty());
 
   // 1: data shown, every ticket refused.
   Select(view, instruments[2]);
@@ -302,6 +306,7 @@ TEST_F(DepthView, AccessStatus_NotViewableNotTradeableAndBoth) {
   EXPECT_EQ(host.dialogs.shown[0].caption, QString("Terminal"));
   EXPECT_EQ(host.dialogs.shown[0].icon, platform::Icon::Exclamation);
   EXPECT_TRUE(host.RequestsOf(hm::OpenView).empty());
+  EXPECT_TRUE(host.RequestsOf(hm::MessageText).empty());
 
   // 3: the ticket opens with side and price of the clicked cell.
   Select(view, instruments[0]);
@@ -473,14 +478,50 @@ TEST_F(DepthView, SaveSpace_OnlyTheTextOneTurnsItOn) {
 
 TEST_F(DepthView, StartParams_UnknownInstrumentClearsAndMalformedIsIgnored) {
   CMarketDepthAdv* view = Make();
-  host.SendLink(view, L"{not json");
-  EXPECT_EQ(view->GetStartProductId(), -1);
-  host.SendLink(view, LinkFor(instruments[0]));
-  EXPECT_EQ(view->GetStartInstrumentCode(), "D05");
+  host.SendLink(view, LinkFor(instruments[0], "1"));
+  ASSERT_EQ(view->GetStartInstrumentCode(), "D05");
+  ASSERT_EQ(view->SaveSpace(), 1);
+  host.ClearRequests();
+  // A text that is not a link changes nothing and asks nothing.
+  for (const wchar_t* bad : {L"{not json", L"", L"[1, 2]", L"{\"type\":\"start\",\"data\":[]}",
+                             L"{\"type\":\"start\",\"data\":[\"D05\"]}"}) {
+    host.SendLink(view, bad);
+    EXPECT_EQ(view->GetStartProductId(), 1) << hv::Narrow(bad);
+    EXPECT_EQ(view->GetStartInstrumentCode(), "D05") << hv::Narrow(bad);
+    ASSERT_NE(view->CurrentInstrument(), nullptr);
+    EXPECT_EQ(view->CurrentInstrument()->instrumentCode, "D05");
+    EXPECT_EQ(view->SaveSpace(), 1) << hv::Narrow(bad);
+  }
+  EXPECT_TRUE(host.Requests().empty());
+
+  // A link to an instrument the list does not have clears the saved instrument.
   JInstrumentUnderlying unknown = Instrument(9, "NOPE", "SGX");
   host.SendLink(view, LinkFor(unknown));
   EXPECT_EQ(view->GetStartProductId(), -1);
   EXPECT_EQ(view->GetStartInstrumentCode(), "");
+}
+
+TEST_F(DepthView, StartParams_UnknownInstrumentClearsTheShownBook) {
+  CMarketDepthAdv* view = Make();
+  const JInstrumentUnderlying& shown = instruments[0];
+  Select(view, shown);
+  for (int level : {0, 1, 2, 3}) {
+    if (level > 0) PushLevel(view, shown, level);
+    host.Advance(200);
+  }
+  ASSERT_EQ(view->GetDepthGrid()->GetNumberRows(), 3);
+
+  host.SendLink(view, LinkFor(Instrument(9, "NOPE", "SGX")));
+  EXPECT_EQ(view->CurrentInstrument(), nullptr);
+  EXPECT_EQ(view->GetDepthGrid()->GetNumberRows(), 0);
+  EXPECT_EQ(view->GetDepthGrid()->GetMessage(), L"");
+  EXPECT_EQ(view->GetTitle(), L"Market Depth");  // no instrument named
+  EXPECT_EQ(view->GetStartProductId(), -1);
+  // The old book goes on updating in the store, but no longer shows here.
+  PushLevel(view, shown, 4);
+  host.Advance(400);
+  EXPECT_EQ(view->GetDepthGrid()->GetNumberRows(), 0);
+  EXPECT_EQ(Dump(view).size(), 1u);  // headings only
 }
 
 TEST_F(DepthView, Title_CashForDmaAndFollowsTheLanguage) {

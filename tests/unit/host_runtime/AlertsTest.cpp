@@ -89,3 +89,35 @@ TEST(HostAlerts, EvaluationTriggersNotifiesAndExpires) {
   RecordingView& v = again.View("CPriceAlertList");
   EXPECT_EQ(List(v).size(), 3u);
 }
+
+TEST(HostAlerts, EachFiringIsShownLoggedAndKeptWithItsAlert) {
+  Harness h;
+  RecordingView& list = h.View("CPriceAlertList");
+  const auto& ins = h.Ins(h.Busy());
+  const sim::Quote q = h.runtime->Market().QuoteOf(h.Busy());
+  PriceAlertItem quiet = AlertOn(ins, "ASK", "<=", q.ask * 2);
+  quiet.viaApp = false;  // no notice on screen, still logged and kept
+  PriceAlertItem loud = AlertOn(ins, "BID", ">=", q.bid / 2);
+  list.Send(hm::Alert702, ToLParam(&quiet));
+  list.Send(hm::Alert702, ToLParam(&loud));
+  h.Pump(100);
+  ASSERT_EQ(h.store.firings.size(), 2u);
+  const auto alerts = List(list);
+  for (const auto& f : h.store.firings) {
+    const PriceAlertItem* a = nullptr;
+    for (const auto& x : alerts) if (x.alertId == f.alertId) a = &x;
+    ASSERT_NE(a, nullptr);
+    EXPECT_EQ(f.firedAt, a->hostTextA);
+    EXPECT_EQ(f.valueText, a->hostTextB);
+    EXPECT_NE(f.notice.find(ins.instrumentCode), std::string::npos);
+    EXPECT_NE(f.notice.find(f.firedAt), std::string::npos);
+  }
+  ASSERT_EQ(h.shell.notices.size(), 1u) << "only the alert that notifies in the terminal";
+  EXPECT_EQ(h.shell.notices[0], hv::Widen(h.store.firings[1].notice));
+  EXPECT_EQ(h.store.LoadAlertFirings(h.store.firings[1].alertId).size(), 1u);
+  // Deleting an alert deletes its history.
+  const std::vector<std::int32_t> ids = {h.store.firings[0].alertId};
+  list.Send(hm::Alert704, ToLParam(&ids));
+  ASSERT_EQ(h.store.firings.size(), 1u);
+  EXPECT_NE(h.store.firings[0].alertId, ids[0]);
+}

@@ -87,7 +87,7 @@ TEST(HostChannel, DeliversReferenceAndWatchlistLists) {
   v.Send(hm::ExchangeList);
   EXPECT_EQ(v.notes.back().count, h.runtime->Market().Exchanges().size());
   v.Send(hm::ProductList);
-  EXPECT_EQ(v.notes.back().count, 6u);
+  EXPECT_EQ(v.notes.back().count, 7u);
   for (const JProduct& p : h.runtime->Market().Products()) {
     const std::wstring file = h.runtime->Styles().ResolveImagePath(hv::Widen(p.pictureFile), 2);
     EXPECT_FALSE(file.empty()) << p.pictureFile;

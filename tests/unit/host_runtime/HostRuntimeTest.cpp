@@ -122,6 +122,68 @@ TEST(HostRuntime, DepthSubscriptionAnswersEveryLevelAndPushesChangedLevels) {
   EXPECT_FALSE(v.Of(hm::FieldValue).empty());
 }
 
+// After the answers and after every pump, the book the view has been told
+// (answers, then pushes applied in order) is the market's book: every field of
+// every level subscribed, with its value.
+TEST(HostRuntime, DepthAnswersAndPushesCarryTheBooksValues) {
+  Harness h;
+  RecordingView& v = h.View("CMarketDepthAdv");
+  const int i = h.Busy();
+  const auto& ins = h.Ins(i);
+  sim::Market& m = h.runtime->Market();
+  const std::vector<std::string> fields = {"ORDS_BVOL", "BVOL", "BUY", "SELL", "SVOL", "ORDS_SVOL"};
+  constexpr int kLevels = 12;
+  // The market's level as the terminal writes it: prices in the instrument's
+  // format, volumes and order counts whole; a side without a price is empty.
+  const auto expected = [&](const std::string& f, int level) -> std::string {
+    const sim::DepthLevel l = m.Depth(i, level);
+    const bool bid = f == "ORDS_BVOL" || f == "BVOL" || f == "BUY";
+    if ((bid ? l.bid : l.ask) <= 0) return {};
+    if (f == "BUY") return m.FormatPrice(i, l.bid);
+    if (f == "SELL") return m.FormatPrice(i, l.ask);
+    if (f == "BVOL") return std::to_string(l.bidVolume);
+    if (f == "SVOL") return std::to_string(l.askVolume);
+    if (f == "ORDS_BVOL") return std::to_string(l.bidOrders);
+    return std::to_string(l.askOrders);
+  };
+  std::map<std::pair<std::string, int>, std::string> told;
+  const auto apply = [&](UINT msg) {
+    int n = 0;
+    for (const auto* note : v.Of(msg)) {
+      if (note->update.kind != 1) continue;
+      EXPECT_EQ(note->update.productId, ins.productId);
+      EXPECT_EQ(note->update.instrumentCode, ins.instrumentCode);
+      told[{note->update.fieldName, int(note->update.param)}] = note->update.value;
+      ++n;
+    }
+    return n;
+  };
+  const auto expectBook = [&](const char* when) {
+    for (int level = 1; level <= kLevels; ++level)
+      for (const auto& f : fields) {
+        const auto it = told.find({f, level});
+        ASSERT_NE(it, told.end()) << when << ": " << f << " " << level << " never sent";
+        EXPECT_EQ(it->second, expected(f, level)) << when << ": " << f << " " << level;
+      }
+    EXPECT_EQ(told.size(), fields.size() * kLevels) << when << ": only the levels subscribed";
+  };
+
+  v.Subscribe(ins.productId, ins.instrumentCode, fields, 1, kLevels);
+  EXPECT_EQ(apply(hm::RequestField), int(fields.size()) * kLevels);
+  expectBook("answers");
+  ASSERT_FALSE(expected("BUY", 1).empty());
+  EXPECT_NE(expected("BVOL", 1), expected("ORDS_BVOL", 1)) << "volumes and order counts differ in this book";
+
+  int pushed = 0;
+  for (int pump = 0; pump < 40; ++pump) {
+    v.Clear();
+    h.Pump(100);
+    pushed += apply(hm::FieldValue);
+    expectBook("after a pump");
+  }
+  EXPECT_GT(pushed, 10);
+}
+
 TEST(HostRuntime, TimeAndSalesPagesAreAnsweredPushedAndWithdrawn) {
   Harness h;
   RecordingView& v = h.View("CTimeAndSalesAdv");

@@ -42,23 +42,35 @@ std::string Snapshot(Market& m, const std::vector<int>& sample) {
 
 }  // namespace
 
-TEST(Market, SameSeedAndClockGiveTheSameMarket) {
-  Market a(Config()), b(Config()), c(Config(8));
+TEST(Market, SameSeedAndClockGiveTheSameMarketWhateverTheStrides) {
+  Market a(Config()), b(Config()), c(Config()), other(Config(8));
   std::vector<int> sample;
   for (int i = 0; i < int(a.Instruments().size()); i += 97) sample.push_back(i);
-  for (int i : sample) { a.AddInterest(i); b.AddInterest(i); c.AddInterest(i); }
-  // The same ticks reached in different strides play the same steps.
+  for (int i : sample) { a.AddInterest(i); b.AddInterest(i); c.AddInterest(i); other.AddInterest(i); }
+  // Strides that are not whole steps (an early or late timer) lose no time:
+  // the part of a step left over counts towards the next call.
   a.AdvanceTo(30000);
-  for (std::uint32_t t = 1000; t <= 30000; t += 1000) b.AdvanceTo(t);
-  c.AdvanceTo(30000);
+  for (std::uint32_t t = 30; t <= 30000; t += 30) b.AdvanceTo(t);
+  for (std::uint32_t t = 75; t <= 30000; t += 75) c.AdvanceTo(t);
+  other.AdvanceTo(30000);
   ASSERT_EQ(a.Instruments().size(), b.Instruments().size());
   for (std::size_t k = 0; k < a.Instruments().size(); k += 50) {
     EXPECT_EQ(a.Instruments()[k].instrumentCode, b.Instruments()[k].instrumentCode);
     EXPECT_EQ(a.Instruments()[k].instrumentName, b.Instruments()[k].instrumentName);
   }
+  EXPECT_EQ(a.TimeText(), "10:30:30");
+  EXPECT_EQ(b.TimeText(), a.TimeText());
+  EXPECT_EQ(c.TimeText(), a.TimeText());
   EXPECT_EQ(Snapshot(a, sample), Snapshot(b, sample));
+  EXPECT_EQ(Snapshot(a, sample), Snapshot(c, sample));
   EXPECT_EQ(a.TakeChanged(), b.TakeChanged());
-  EXPECT_NE(Snapshot(a, sample), Snapshot(c, sample));
+  EXPECT_NE(Snapshot(a, sample), Snapshot(other, sample));
+
+  // A tick behind the market's plays nothing and loses nothing.
+  a.AdvanceTo(29000);
+  EXPECT_EQ(a.TimeText(), "10:30:30");
+  a.AdvanceTo(31000);
+  EXPECT_EQ(a.TimeText(), "10:30:31");
 }
 
 TEST(Market, ReferenceDataCoversProductsExchangesAndAccess) {
@@ -66,7 +78,7 @@ TEST(Market, ReferenceDataCoversProductsExchangesAndAccess) {
   EXPECT_EQ(m.Instruments().size(), 4000u);
   std::set<std::string> types, exchanges;
   for (const auto& p : m.Products()) types.insert(p.productType);
-  EXPECT_EQ(types, (std::set<std::string>{"ES", "CS", "CFD", "FUT", "FX", "DMA"}));
+  EXPECT_EQ(types, (std::set<std::string>{"ES", "CS", "CFD", "FUT", "FX", "DMA", "IDX"}));
   for (const auto& e : m.Exchanges()) exchanges.insert(e.exchangeCode);
   for (const char* e : {"SGX", "SEHK", "TSE", "WIDX"}) EXPECT_TRUE(exchanges.count(e)) << e;
 
@@ -99,7 +111,10 @@ TEST(Market, ReferenceDataCoversProductsExchangesAndAccess) {
   EXPECT_GT(viewOnly, 0);
   EXPECT_GT(futures, 0);
   EXPECT_GE(m.WorldIndices().size(), 10u);
-  for (int i : m.WorldIndices()) EXPECT_EQ(m.Instruments()[i].exchangeCode, "WIDX");
+  for (int i : m.WorldIndices()) {
+    EXPECT_EQ(m.Instruments()[i].exchangeCode, "WIDX");
+    EXPECT_EQ(m.Instruments()[i].productType, "IDX") << "an index is typed as one";
+  }
   EXPECT_FALSE(m.Sectors().empty());
   for (const auto& b : m.BrandWatchlists()) {
     EXPECT_FALSE(b.instruments.empty());
@@ -289,4 +304,127 @@ TEST(Market, StepTablesFallBackToTheDefaultTable) {
   EXPECT_DOUBLE_EQ(m.StepAt(0, 1.0, false), 0.005) << "downwards at a boundary the band below applies";
   EXPECT_DOUBLE_EQ(m.StepAt(2, 3500), 5);
   EXPECT_DOUBLE_EQ(m.StepAt(77, 0.5), 0.005) << "unknown table";
+}
+
+TEST(Market, EveryInstrumentReadsApartByItsTicker) {
+  Market m(Config(11, 6000));
+  std::set<std::string> symbols, labels;
+  for (const auto& r : m.Instruments()) {
+    // What the instrument box lists: name [exchange : symbol], the display code for CFDs and DMA.
+    const std::string shown = r.productType == "CFD" || r.productType == "DMA" ? r.displayCode : r.symbol;
+    EXPECT_TRUE(labels.insert(r.instrumentName + " [" + r.exchangeCode + " : " + shown + "]").second)
+        << "listed twice: " << r.instrumentName << " " << r.exchangeCode << " " << shown;
+    ASSERT_FALSE(r.symbol.empty()) << r.instrumentCode;
+    EXPECT_LE(r.symbol.size(), 7u) << r.symbol;
+    EXPECT_EQ(r.symbol.find(' '), std::string::npos) << r.symbol;
+    EXPECT_EQ(r.symbol, r.displayCode) << "the symbol is the code traders type: " << r.instrumentCode;
+    const bool ownMarket = r.instrumentCode.rfind("[KELDO]", 0) != 0 &&
+                           (r.productType == "ES" || r.productType == "FUT" || r.productType == "FX" ||
+                            r.productType == "IDX");
+    if (ownMarket) {
+      EXPECT_TRUE(symbols.insert(r.symbol).second) << "two instruments share " << r.symbol;
+    }
+    if (r.productType == "ES" && (r.exchangeCode == "NYSE" || r.exchangeCode == "NASDAQ" ||
+                                  r.exchangeCode == "ASX" || r.exchangeCode == "LSE")) {
+      // A ticker made from the company's name.
+      EXPECT_GE(r.symbol.size(), 3u) << r.symbol;
+      for (char c : r.symbol) EXPECT_TRUE(c >= 'A' && c <= 'Z') << r.symbol;
+      const std::string name = r.instrumentName.rfind("O'", 0) == 0 ? r.instrumentName.substr(2) : r.instrumentName;
+      EXPECT_EQ(r.symbol[0], std::toupper(static_cast<unsigned char>(name[0]))) << r.symbol << " " << r.instrumentName;
+    }
+  }
+}
+
+namespace {
+// Best prices and top levels of a book, for comparing two moments.
+struct Top {
+  std::vector<sim::DepthLevel> levels;
+  bool SameBest(const Top& o) const {
+    return levels[0].bid == o.levels[0].bid && levels[0].ask == o.levels[0].ask;
+  }
+  int ChangedLevels(const Top& o) const {
+    int n = 0;
+    for (std::size_t k = 0; k < levels.size(); ++k) {
+      const auto &a = levels[k], &b = o.levels[k];
+      n += a.bid != b.bid || a.bidVolume != b.bidVolume || a.bidOrders != b.bidOrders;
+      n += a.ask != b.ask || a.askVolume != b.askVolume || a.askOrders != b.askOrders;
+    }
+    return n;
+  }
+};
+}  // namespace
+
+TEST(Market, BookChangesTheWayRealBooksDo) {
+  Market m(Config());
+  const int i = m.LiquidStock();
+  ASSERT_GE(i, 0);
+  m.AddInterest(i);
+  Top before{m.Book(i, 10)};
+  std::size_t tradesBefore = m.Trades(i).size();
+  int updates = 0, bestMoves = 0, fewLevels = 0, trades = 0, tradesAtTouch = 0;
+  // One simulated minute, looked at after every step.
+  for (std::uint32_t t = Market::kStepMs; t <= 60000; t += Market::kStepMs) {
+    m.AdvanceTo(t);
+    Top now{m.Book(i, 10)};
+    const auto& tape = m.Trades(i);
+    for (std::size_t k = tradesBefore; k < tape.size(); ++k) {
+      ++trades;
+      const auto& tr = tape[k];
+      // A buy takes the best offer, a sell the best bid, as they stood before.
+      if ((tr.side == 1 && tr.price == before.levels[0].ask) || (tr.side == 2 && tr.price == before.levels[0].bid))
+        ++tradesAtTouch;
+    }
+    tradesBefore = tape.size();
+    const int changed = now.ChangedLevels(before);
+    if (changed > 0) {
+      ++updates;
+      if (!now.SameBest(before)) ++bestMoves;
+      else if (changed <= 2) ++fewLevels;
+    }
+    before = std::move(now);
+  }
+  ASSERT_GT(updates, 100) << "a liquid stock updates several times a second";
+  EXPECT_LT(bestMoves * 4, updates) << bestMoves << " of " << updates << " updates moved the best price";
+  EXPECT_GT(bestMoves, 0) << "the best price moves now and then";
+  EXPECT_GT(fewLevels * 2, updates) << "most updates change the size at one or two levels";
+  ASSERT_GT(trades, 20);
+  EXPECT_GE(tradesAtTouch * 100, trades * 97) << tradesAtTouch << " of " << trades << " trades at the best price";
+  // Still a book: ordered, one step apart, sizes and orders that fit.
+  const auto book = m.Book(i, 99);
+  for (std::size_t k = 1; k < book.size(); ++k) {
+    EXPECT_GT(book[k].ask, book[k - 1].ask);
+    if (book[k].bid > 0) {
+      EXPECT_LT(book[k].bid, book[k - 1].bid);
+    }
+    EXPECT_GE(book[k].askOrders, 1);
+    EXPECT_LE(book[k].askOrders, book[k].askVolume);
+  }
+  EXPECT_LT(book[0].bid, book[0].ask);
+  EXPECT_EQ(book[0].bidVolume, m.QuoteOf(i).bidVolume);
+  EXPECT_EQ(book[0].askVolume, m.QuoteOf(i).askVolume);
+}
+
+TEST(Market, IndicesTickWithoutABookAndTheFirstStartHasALiquidStock) {
+  Market m(Config());
+  ASSERT_FALSE(m.WorldIndices().empty());
+  const int index = m.WorldIndices().front();
+  m.AddInterest(index);
+  m.AdvanceTo(30000);
+  EXPECT_GT(m.QuoteOf(index).last, 0);
+  EXPECT_EQ(m.QuoteOf(index).bid, 0);
+  EXPECT_EQ(m.FieldValue(index, "BID", 0, 0), "");
+  EXPECT_EQ(m.FieldValue(index, "BUY", 1, 1), "") << "an index has no order book";
+  for (const auto& level : m.Book(index, 5)) {
+    EXPECT_EQ(level.bid, 0);
+    EXPECT_EQ(level.ask, 0);
+  }
+
+  const int stock = m.LiquidStock();
+  ASSERT_GE(stock, 0);
+  const auto& r = m.Instruments()[stock];
+  EXPECT_EQ(r.productType, "ES");
+  EXPECT_EQ(r.exchangeCode, "SGX");
+  EXPECT_EQ(r.accessStatus, 3);
+  EXPECT_GT(m.QuoteOf(stock).trades, m.QuoteOf(BusyEquity(m)).trades / 2) << "one of the busiest";
+  EXPECT_GT(m.Book(stock, 1)[0].bid, 0);
 }

@@ -262,6 +262,49 @@ TEST_F(StoreSetAside, Newer_DatabaseFromANewerTerminalIsKeptAndReported) {
   ExpectSetAside(Outcome::ReplacedNewer, "newer terminal");
 }
 
+// A database of the first format (before the blotter) opens in place, keeps
+// everything and gains the orders table.
+TEST(Store, Upgrade_OlderDatabaseKeepsItsDataAndGainsTheBlotter) {
+  TempDir dir;
+  const auto layout = SampleLayout();
+  {
+    StoreOpenReport report;
+    auto store = OpenOk(dir.path, report);
+    ASSERT_TRUE(store->SaveSettings({{"ui.style", "2"}}));
+    ASSERT_TRUE(store->SaveWatchlists(0, {{0, 9, "Banks", "<wl/>"}}));
+    ASSERT_TRUE(store->SaveAlerts({{5, "alert five"}}));
+    ASSERT_TRUE(store->SaveLayout(layout));
+  }
+  // What a terminal of the first format left behind.
+  RunSql(dir.path / Store::kFileName, "DROP TABLE orders; DROP TABLE alert_firings; PRAGMA user_version=1;");
+  StoreOpenReport report;
+  auto store = OpenOk(dir.path, report);
+  ASSERT_TRUE(store);
+  EXPECT_EQ(report.outcome, Outcome::Opened);
+  EXPECT_EQ(report.upgradedFrom, 1);
+  EXPECT_TRUE(report.setAsidePath.empty());
+  EXPECT_EQ(store->LoadSettings().at("ui.style"), "2");
+  ASSERT_EQ(store->LoadWatchlists(0).size(), 1u);
+  EXPECT_EQ(store->LoadAlerts().at(0).body, "alert five");
+  EXPECT_EQ(store->LoadLayout().views.size(), layout.views.size());
+  EXPECT_EQ(store->LastOrderNumber(), 0);
+  term::OrderRow order{7, "2026-12-07", "10:31:02", "Buy", 101, "D05", 300, 12.345, "Limit", "Day", "-", "Working"};
+  ASSERT_TRUE(store->SaveOrder(order)) << store->LastError();
+  order.status = "Filled";
+  ASSERT_TRUE(store->SaveOrder(order));
+  store.reset();
+
+  auto again = OpenOk(dir.path, report);
+  EXPECT_EQ(report.upgradedFrom, 0) << "brought up to date once";
+  const auto orders = again->LoadOrders("2026-12-07");
+  ASSERT_EQ(orders.size(), 1u);
+  EXPECT_EQ(orders[0].status, "Filled");
+  EXPECT_DOUBLE_EQ(orders[0].price, 12.345);
+  EXPECT_EQ(orders[0].instrumentCode, "D05");
+  EXPECT_TRUE(again->LoadOrders("2026-12-08").empty()) << "another day's blotter is empty";
+  EXPECT_EQ(again->LastOrderNumber(), 7);
+}
+
 TEST(Store, Open_UnusableFolderIsAnError) {
   TempDir dir;
   WriteFile(dir.path / "file", "x");

@@ -7,6 +7,7 @@
 #include <QLineEdit>
 #include <QVBoxLayout>
 #include <cstdlib>
+#include <set>
 
 #include "UiTestApp.h"
 #include "chart/BarChart.h"
@@ -102,6 +103,26 @@ class Board : public CGridCtrl {
   }
 };
 
+// Whether `r` of `img` holds a pixel within `tolerance` (per channel) of `c`.
+bool HasColour(const QImage& img, const QRect& r, const QColor& c, int tolerance = 0) {
+  for (int y = r.top(); y <= r.bottom(); ++y)
+    for (int x = r.left(); x <= r.right(); ++x) {
+      const QColor p = img.pixelColor(x, y);
+      if (std::abs(p.red() - c.red()) <= tolerance && std::abs(p.green() - c.green()) <= tolerance &&
+          std::abs(p.blue() - c.blue()) <= tolerance)
+        return true;
+    }
+  return false;
+}
+
+// Distinct colours in `r` of `img`.
+int Colours(const QImage& img, const QRect& r) {
+  std::set<QRgb> seen;
+  for (int y = r.top(); y <= r.bottom(); ++y)
+    for (int x = r.left(); x <= r.right(); ++x) seen.insert(img.pixel(x, y));
+  return int(seen.size());
+}
+
 TEST(DemoRender, Demo_RendersCellTypesTilesAndChart) {
   UiApp();
   static std::vector<JInstrumentUnderlying> list(3);
@@ -184,11 +205,37 @@ TEST(DemoRender, Demo_RendersCellTypesTilesAndChart) {
   const QString path = dir + QStringLiteral("/mv_ui_demo.png");
   ASSERT_TRUE(img.save(path));
   std::printf("demo image: %s\n", qPrintable(path));
-  // Something was drawn in each part: the tile's title strip is dark, the chart has bar colours.
-  const QPoint strip = board->mapTo(&page, QPoint(100, 6));
-  EXPECT_NE(img.pixelColor(strip), QColor(Qt::white)) << "the tile's title strip";
-  EXPECT_EQ(chart->VisibleGroups().size(), 10u);
-  EXPECT_EQ(chart->SeriesColor(0), 0x7373FFu);
+
+  // The picture shows what each part draws. Cell types: the coloured cell's
+  // background, the selected row in the selection colour, and the check box,
+  // arrows and buttons drawing something in cells that have no text.
+  const auto rectOn = [&](QWidget* w, const QRect& r) { return QRect(w->mapTo(&page, r.topLeft()), r.size()); };
+  const auto cellOf = [&](CGridCtrl* g, int col, int row) {
+    return rectOn(g->viewport(), g->CellRect(col, row)).adjusted(2, 2, -2, -2);
+  };
+  EXPECT_TRUE(HasColour(img, cellOf(types, 3, 7), QColor(214, 245, 214))) << "coloured cell";
+  EXPECT_TRUE(HasColour(img, cellOf(types, 0, 8), types->GetColors().selBack)) << "selected row";
+  EXPECT_FALSE(HasColour(img, cellOf(types, 0, 7), types->GetColors().selBack)) << "only the selected row";
+  for (int row : {1, 2, 4, 5, 6}) EXPECT_GE(Colours(img, cellOf(types, 3, row)), 3) << "cell type of row " << row;
+  EXPECT_LE(Colours(img, cellOf(types, 3, 3)), 1) << "the empty cell type draws nothing";
+  // Tiles: each tile is drawn, and the quantity field of the tile flagged
+  // invalid is framed in the falling colour.
+  for (int col = 0; col < 3; ++col) EXPECT_GE(Colours(img, cellOf(board, col, 0)), 8) << "tile " << col;
+  const auto fieldEdge = [&](int col) {
+    const QRect cell = board->CellRect(col, 0);
+    const QRect field = PBoardTypeEx::AreaBox(cell, PBoardTypeEx::kQtyField).ToRect();
+    return img.pixelColor(board->viewport()->mapTo(&page, QPoint(field.left(), field.center().y())));
+  };
+  EXPECT_EQ(fieldEdge(1), QColor(250, 0, 0));
+  EXPECT_NE(fieldEdge(0), QColor(250, 0, 0));
+  // Chart: the bars of all three series are on screen.
+  const QRect plot = rectOn(chart, chart->rect());
+  for (unsigned series : {0x7373FFu, 0x50D092u, 0xBD814Fu}) {  // colour words: 0x00BBGGRR
+    const QColor colour(int(series & 0xFF), int((series >> 8) & 0xFF), int((series >> 16) & 0xFF));
+    EXPECT_TRUE(HasColour(img, plot, colour)) << std::hex << series;
+  }
+  // The instrument box shows its placeholder in grey.
+  EXPECT_TRUE(HasColour(img, rectOn(combo, combo->rect()), QColor(0xAA, 0xAA, 0xAA), 40)) << "placeholder";
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <QHelpEvent>
 #include <QLineEdit>
 #include <QTest>
+#include <map>
 #include <set>
 #include <string>
 #include <vector>
@@ -415,3 +416,105 @@ TEST_F(GridTest, Grid_DumpShowsHeadingsAndEveryRowWithoutHiddenColumns) {
   EXPECT_EQ(lines[1], QStringLiteral("r0c0\tr0c2"));
   EXPECT_EQ(lines[40], QStringLiteral("r39c0\tr39c2"));
 }
+
+namespace {
+
+// A grid that shows only what is stored in it, or the texts a test gives.
+class StoredGrid : public CGridCtrl {
+ public:
+  StoredGrid(int cols, int rows) {
+    SetNumberCols(cols);
+    SetNumberRows(rows);
+    for (int c = 0; c < cols; ++c) SetColWidth(c, 50 + 10 * c);
+    resize(400, 300);
+  }
+  std::map<std::pair<int, int>, QString> texts;  // overrides by (col, row)
+
+ protected:
+  void OnGetCell(int col, int row, CGridCell& cell) override {
+    auto it = texts.find({col, row});
+    if (it != texts.end()) cell.text = it->second;
+  }
+};
+
+// A moved column takes its stored cells (headings included), its flags and
+// its width; the columns between shift by one; the side heading stays.
+TEST_F(GridTest, Grid_MovedColumnTakesItsStoredCellsFlagsAndWidth) {
+  StoredGrid g(4, 3);
+  for (int c = 0; c < 4; ++c) {
+    g.QuickSetText(c, -1, QStringLiteral("H%1").arg(c));
+    for (int r = 0; r < 3; ++r) g.QuickSetText(c, r, QStringLiteral("c%1r%2").arg(c).arg(r));
+  }
+  g.QuickSetText(-1, 1, QStringLiteral("side"));
+  g.SetCellFlags(1, 2, 0x40);
+  g.SetCellFlags(3, 0, 0x80);
+  g.GotoCell(1, 0);
+
+  g.MoveColumn(1, 3);
+  EXPECT_EQ(g.dumpTsv(), QStringLiteral("H0\tH2\tH3\tH1\n"
+                                        "c0r0\tc2r0\tc3r0\tc1r0\n"
+                                        "c0r1\tc2r1\tc3r1\tc1r1\n"
+                                        "c0r2\tc2r2\tc3r2\tc1r2\n"));
+  EXPECT_EQ(g.GetCellFlags(3, 2), 0x40u);
+  EXPECT_EQ(g.GetCellFlags(1, 2), 0u);
+  EXPECT_EQ(g.GetCellFlags(2, 0), 0x80u);
+  EXPECT_EQ((std::vector<int>{g.GetColWidth(0), g.GetColWidth(1), g.GetColWidth(2), g.GetColWidth(3)}),
+            (std::vector<int>{50, 70, 80, 60}));
+  EXPECT_EQ(g.GetCurrentCol(), 3) << "the current cell moves with its column";
+  CGridCell side;
+  g.GetCell(-1, 1, side);
+  EXPECT_EQ(side.text, QStringLiteral("side"));
+
+  // And back to the left: the order is restored.
+  g.MoveColumn(3, 1);
+  EXPECT_EQ(g.dumpTsv().split('\n')[1], QStringLiteral("c0r0\tc1r0\tc2r0\tc3r0"));
+  EXPECT_EQ(g.GetCellFlags(1, 2), 0x40u);
+  EXPECT_EQ(g.GetCellFlags(3, 0), 0x80u);
+  // Moves outside the columns do nothing.
+  g.MoveColumn(0, 4);
+  g.MoveColumn(-1, 2);
+  EXPECT_EQ(g.dumpTsv().split('\n')[0], QStringLiteral("H0\tH1\tH2\tH3"));
+}
+
+TEST_F(GridTest, Grid_SingleSelectionKeepsOneRowWhateverIsAdded) {
+  RecordingGrid g(3, 10);
+  g.show();
+  g.SetSelectionMode(CGridCtrl::SingleSelection);
+  g.SelectRow(2);
+  g.SelectRow(5, true);
+  EXPECT_EQ(g.GetSelectedRows(), (std::vector<int>{5}));
+  g.SelectRange(1, 3, true);
+  EXPECT_EQ(g.GetSelectedRows(), (std::vector<int>{3}));
+  Press(g, CellCenter(g, 0, 7), Qt::ControlModifier);
+  Release(g, CellCenter(g, 0, 7), Qt::ControlModifier);
+  EXPECT_EQ(g.GetSelectedRows(), (std::vector<int>{7}));
+
+  // With multiple selection the same calls add.
+  g.SetSelectionMode(CGridCtrl::MultiSelection);
+  g.SelectRow(2, true);
+  g.SelectRange(4, 5, true);
+  EXPECT_EQ(g.GetSelectedRows(), (std::vector<int>{2, 4, 5, 7}));
+  g.SelectRow(9);
+  EXPECT_EQ(g.GetSelectedRows(), (std::vector<int>{9}));
+}
+
+// Tabs and line breaks inside a cell would shift columns and rows of the dump:
+// they become spaces there (and only there).
+TEST_F(GridTest, Grid_DumpKeepsOneLinePerRowWhateverTheCellsHold) {
+  StoredGrid g(3, 2);
+  g.texts[{0, -1}] = QStringLiteral("Na\tme");
+  g.texts[{1, -1}] = QStringLiteral("Two\nLines");
+  g.texts[{2, -1}] = QStringLiteral("Plain");
+  g.texts[{0, 0}] = QStringLiteral("a\tb\tc");
+  g.texts[{1, 0}] = QStringLiteral("x\r\ny");
+  g.texts[{2, 0}] = QStringLiteral("\t");
+  g.texts[{1, 1}] = QStringLiteral("last");
+  EXPECT_EQ(g.dumpTsv(), QStringLiteral("Na me\tTwo Lines\tPlain\n"
+                                        "a b c\tx  y\t \n"
+                                        "\tlast\t\n"));
+  CGridCell cell;
+  g.GetCell(0, 0, cell);
+  EXPECT_EQ(cell.text, QStringLiteral("a\tb\tc")) << "the cell itself keeps its text";
+}
+
+}  // namespace

@@ -1,8 +1,10 @@
 #include <gtest/gtest.h>
 
+#include <QAbstractItemView>
 #include <QFocusEvent>
 #include <QLineEdit>
 #include <QTest>
+#include <QWindow>
 
 #include "UiTestApp.h"
 #include "controls/InstrumentComboBox.h"
@@ -27,47 +29,6 @@ std::vector<std::string> Names(const std::vector<JInstrumentUnderlying>& list, c
   std::vector<std::string> out;
   for (int p : positions) out.push_back(list[std::size_t(p)].instrumentName);
   return out;
-}
-
-TEST(InstrumentSearchTest, Search_GroupsComeInOrderNamePrefixSymbolPrefixNameSymbol) {
-  const std::vector<JInstrumentUnderlying> list{
-      Ins("Zed Symbol Contains", "ZAB"), Ins("Xab", "X1"), Ins("Nothing", "N1"), Ins("Prefix Symbol", "AB1"),
-      Ins("Abc", "C1"), Ins("Exchange Only", "E1", "XABX")};
-  InstrumentSearchIndex index;
-  index.Build(list);
-  EXPECT_EQ(Names(list, index.Search("ab")),
-            (std::vector<std::string>{"Abc", "Prefix Symbol", "Xab", "Zed Symbol Contains", "Exchange Only"}));
-  for (std::size_t i = 0; i < list.size(); ++i) {
-    // The index agrees with the one-by-one rule.
-    const auto g = InstrumentSearchIndex::Classify(list[i], "ab");
-    const auto found = index.Search("ab");
-    EXPECT_EQ(g != InstrumentSearchIndex::kNone, std::find(found.begin(), found.end(), int(i)) != found.end()) << i;
-  }
-}
-
-TEST(InstrumentSearchTest, Search_OrderWithinAGroupDependsOnKeyLength) {
-  const std::vector<JInstrumentUnderlying> list{Ins("Abz", "S1"), Ins("xxAb", "S2"), Ins("Aba", "S3"),
-                                                Ins("xAbq", "S4"), Ins("xAba", "S5")};
-  InstrumentSearchIndex index;
-  index.Build(list);
-  // Two letters: name prefix alphabetically, then contains by offset and name.
-  EXPECT_EQ(Names(list, index.Search("ab")), (std::vector<std::string>{"Aba", "Abz", "xAba", "xAbq", "xxAb"}));
-  // One letter: list order inside each group.
-  EXPECT_EQ(Names(list, index.Search("a")), (std::vector<std::string>{"Abz", "Aba", "xxAb", "xAbq", "xAba"}));
-  // Upper-case letters of the data match the lowered key; nothing else is folded.
-  EXPECT_TRUE(index.Search("ABA").empty()) << "the key arrives lowered";
-  EXPECT_EQ(index.Search("").size(), list.size());
-  EXPECT_TRUE(index.Search("zzz").empty());
-}
-
-TEST(InstrumentSearchTest, Search_MatchesNeverSpanTwoInstruments) {
-  const std::vector<JInstrumentUnderlying> list{Ins("ab", "s1"), Ins("cd", "s2"), Ins("", ""), Ins("bc", "s3")};
-  InstrumentSearchIndex index;
-  index.Build(list);
-  EXPECT_TRUE(index.Search("bc").size() == 1u);
-  EXPECT_EQ(index.Search("bc").front(), 3);
-  EXPECT_TRUE(index.Search("abc").empty());
-  EXPECT_EQ(index.Search(std::string("a\0", 2)).size(), 0u);
 }
 
 class FixedLanguage : public ILanguage {
@@ -150,6 +111,77 @@ TEST_F(ComboTest, Combo_TypingSearchesAfterThePause) {
   EXPECT_EQ(combo.ItemPositions(), (std::vector<int>{0, 1, 2, 3, 4}));
 }
 
+// Keys as the windowing system delivers them: to the window, which hands them
+// to the open drop-down when there is one, else to the focused widget.
+void KeyToWindow(QWidget* w, Qt::Key key, const QString& text = QString()) {
+  QWindow* window = w->window()->windowHandle();
+  ASSERT_NE(window, nullptr);
+  QTest::sendKeyEvent(QTest::KeyAction::Click, window, key, text, Qt::NoModifier);
+}
+void TypeToWindow(QWidget* w, const QString& text) {
+  for (QChar ch : text) KeyToWindow(w, Qt::Key(ch.toUpper().unicode()), QString(ch));
+}
+
+TEST_F(ComboTest, Combo_TypingGoesOnWhileTheDropDownIsOpen) {
+  std::vector<JInstrumentUnderlying> list{Ins("Abc Holdings", "A1"), Ins("Xab", "X1"), Ins("Abd", "A2"),
+                                          Ins("Nothing", "N1"), Ins("Other", "ZABC"), Ins("Abcd", "A3")};
+  CInstrumentComboBox combo;
+  combo.AttachList(&list, {});
+  combo.show();
+  QApplication::setActiveWindow(&combo);
+  combo.lineEdit()->setFocus();
+  ASSERT_TRUE(combo.lineEdit()->hasFocus());
+  combo.lineEdit()->clear();
+
+  TypeToWindow(&combo, QStringLiteral("ab"));
+  clock->Advance(100);
+  ASSERT_TRUE(combo.view()->isVisible()) << "the search opens the drop-down";
+  EXPECT_EQ(combo.ItemCount(), 5);
+  EXPECT_EQ(QApplication::activePopupWidget(), combo.view()->window()) << "the list has the keyboard now";
+
+  TypeToWindow(&combo, QStringLiteral("c"));
+  EXPECT_EQ(combo.lineEdit()->text().toStdString(), "abc");
+  clock->Advance(100);
+  EXPECT_EQ(combo.lineEdit()->text().toStdString(), "abc");
+  EXPECT_EQ(combo.LastSearch().toStdString(), "abc");
+  EXPECT_EQ(Names(list, combo.ItemPositions()), (std::vector<std::string>{"Abc Holdings", "Abcd", "Other"}));
+  EXPECT_TRUE(combo.view()->isVisible()) << "the list stays open, refitted";
+
+  // Editing keys go to the text as well.
+  KeyToWindow(&combo, Qt::Key_Backspace);
+  EXPECT_EQ(combo.lineEdit()->text().toStdString(), "ab");
+  TypeToWindow(&combo, QStringLiteral("cd"));
+  clock->Advance(100);
+  EXPECT_EQ(combo.lineEdit()->text().toStdString(), "abcd");
+  EXPECT_EQ(Names(list, combo.ItemPositions()), (std::vector<std::string>{"Abcd"}));
+
+  // Enter picks the highlighted match.
+  int chosen = 0;
+  QObject::connect(&combo, &CInstrumentComboBox::InstrumentChosen, [&] { ++chosen; });
+  KeyToWindow(&combo, Qt::Key_Backspace);
+  clock->Advance(100);
+  ASSERT_EQ(Names(list, combo.ItemPositions()), (std::vector<std::string>{"Abc Holdings", "Abcd", "Other"}));
+  ASSERT_TRUE(combo.view()->isVisible());
+  KeyToWindow(&combo, Qt::Key_Down);  // the list moves its highlight
+  EXPECT_EQ(combo.lineEdit()->text().toStdString(), "abc");
+  KeyToWindow(&combo, Qt::Key_Return);
+  EXPECT_EQ(chosen, 1);
+  EXPECT_FALSE(combo.view()->isVisible());
+  EXPECT_EQ(combo.GetChosenInstrument().instrumentName, "Abcd");
+
+  // A click picks the match under the pointer.
+  combo.lineEdit()->setFocus();
+  combo.lineEdit()->selectAll();
+  TypeToWindow(&combo, QStringLiteral("oth"));
+  clock->Advance(100);
+  ASSERT_TRUE(combo.view()->isVisible());
+  ASSERT_EQ(Names(list, combo.ItemPositions()), (std::vector<std::string>{"Other", "Nothing"}));
+  const QRect second = combo.view()->visualRect(combo.view()->model()->index(1, 0));
+  QTest::mouseClick(combo.view()->viewport(), Qt::LeftButton, {}, second.center());
+  EXPECT_EQ(chosen, 2);
+  EXPECT_EQ(combo.GetChosenInstrument().instrumentName, "Nothing");
+}
+
 TEST_F(ComboTest, Combo_SelectByKeyAndChosenInstrument) {
   std::vector<JInstrumentUnderlying> list;
   for (int i = 0; i < 300; ++i) list.push_back(Ins("Name " + std::to_string(i), "S" + std::to_string(i), "HKEX", i % 3));
@@ -219,7 +251,7 @@ TEST_F(ComboTest, Combo_PlaceholderWhenEmptyAndGrey) {
   QApplication::sendEvent(combo.lineEdit(), &in);
   combo.lineEdit()->setText(QStringLiteral("ab"));
   QApplication::sendEvent(combo.lineEdit(), &out);
-  EXPECT_EQ(combo.lineEdit()->text(), QStringLiteral("ab"));
+  EXPECT_EQ(combo.lineEdit()->text().toStdString(), "ab");
 }
 
 }  // namespace

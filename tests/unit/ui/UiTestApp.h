@@ -6,6 +6,7 @@
 #include <QPainter>
 #include <QWidget>
 
+#include "mvtest/ProcessStateReset.h"
 #include "platform/Platform.h"
 
 inline QApplication& UiApp() {

@@ -13,8 +13,10 @@
 // Views come from the add-on library named by the environment variable
 // MV_ADDON (else <build>/lib next to the test folder), loaded with dlopen and
 // GetBaseViewPointer as the terminal does.
-// The library stays loaded for the life of the process. A test can also hand
-// in a view it built itself (Adopt) to reach the add-on's internals.
+// Each scripted host gets views from a fresh copy of the library, whose
+// process-wide state (stores, registries, first-time flags) starts empty as in
+// a new process; copies stay loaded for the life of the process. A test can
+// also hand in a view it built itself (Adopt) to reach the add-on's internals.
 #include <any>
 #include <functional>
 #include <map>
@@ -31,10 +33,14 @@
 
 namespace mvtest {
 
-// The add-on library, loaded once per process.
+// The add-on library: the copy of the current scripted host.
 class AddonLibrary {
  public:
+  // The current copy, loaded on first use.
   static AddonLibrary& Get();
+  // The next Get loads a new copy of the library file (a new file, so that the
+  // loader does not hand back the loaded one). Each scripted host calls it.
+  static void StartFresh();
   bool Loaded() const { return m_entry != nullptr; }
   const std::string& Path() const { return m_path; }
   const std::string& Error() const { return m_error; }
@@ -42,7 +48,7 @@ class AddonLibrary {
   const CRuntimeClass* Find(const char* className) const;
 
  private:
-  AddonLibrary();
+  explicit AddonLibrary(int copy);
   using Entry = const CRuntimeClass* (*)(const char*);
   Entry m_entry = nullptr;
   std::string m_path;

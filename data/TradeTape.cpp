@@ -1,0 +1,206 @@
+#include "data/TradeTape.h"
+
+#include <algorithm>
+#include <limits>
+#include <utility>
+#include <vector>
+
+#include "data/ProcessState.h"
+
+namespace mvd {
+namespace {
+
+constexpr bool IsBlank(wchar_t c) { return c == L' ' || c == L'\t' || c == L'\r' || c == L'\n'; }
+
+// A whole number above 0 that fits 32 bits (surrounding blanks allowed); 0 otherwise.
+std::int32_t ReadTradeNumber(std::wstring_view s) {
+  std::size_t b = 0;
+  std::size_t e = s.size();
+  while (b < e && IsBlank(s[b])) ++b;
+  while (e > b && IsBlank(s[e - 1])) --e;
+  if (b < e && s[b] == L'+') ++b;
+  if (b == e) return 0;
+  std::int64_t v = 0;
+  for (std::size_t i = b; i < e; ++i) {
+    if (s[i] < L'0' || s[i] > L'9') return 0;
+    v = v * 10 + (s[i] - L'0');
+    if (v > std::numeric_limits<std::int32_t>::max()) return 0;
+  }
+  return static_cast<std::int32_t>(v);
+}
+
+// Splits one item into its six fields; false for any other count.
+bool SplitItem(std::wstring_view item, std::array<std::wstring_view, 6>& fields) {
+  std::size_t n = 0;
+  std::size_t start = 0;
+  for (;;) {
+    const std::size_t bar = item.find(L'|', start);
+    if (n == fields.size()) return false;
+    fields[n++] = item.substr(start, bar == std::wstring_view::npos ? std::wstring_view::npos : bar - start);
+    if (bar == std::wstring_view::npos) break;
+    start = bar + 1;
+  }
+  return n == fields.size();
+}
+
+// Calls f(fields, number) for every valid item; stops when f returns false.
+template <class F>
+int ForEachItem(std::wstring_view text, F&& f) {
+  int valid = 0;
+  std::size_t start = 0;
+  std::array<std::wstring_view, 6> fields;
+  while (start <= text.size()) {
+    const std::size_t semi = text.find(L';', start);
+    const std::wstring_view item =
+        text.substr(start, semi == std::wstring_view::npos ? std::wstring_view::npos : semi - start);
+    if (SplitItem(item, fields)) {
+      if (const std::int32_t number = ReadTradeNumber(fields[5]); number > 0) {
+        ++valid;
+        if (!f(fields, number)) break;
+      }
+    }
+    if (semi == std::wstring_view::npos) break;
+    start = semi + 1;
+  }
+  return valid;
+}
+
+}  // namespace
+
+int ParseTradeData(std::wstring_view text, const std::function<void(TradeRecord&&)>& f) {
+  return ForEachItem(text, [&](const std::array<std::wstring_view, 6>& fields, std::int32_t number) {
+    TradeRecord r;
+    r.number = number;
+    r.time.assign(fields[0]);
+    r.price.assign(fields[1]);
+    r.volume.assign(fields[2]);
+    r.side.assign(fields[3]);
+    f(std::move(r));
+    return true;
+  });
+}
+
+std::int32_t FirstTradeNumber(std::wstring_view text) {
+  std::int32_t first = 0;
+  ForEachItem(text, [&](const auto&, std::int32_t number) {
+    first = number;
+    return false;
+  });
+  return first;
+}
+
+std::int32_t NewestTradeNumber(std::wstring_view text) {
+  std::int32_t newest = 0;
+  ForEachItem(text, [&](const auto&, std::int32_t number) {
+    if (number > newest) newest = number;
+    return true;
+  });
+  return newest;
+}
+
+}  // namespace mvd
+
+TradeTape& TradeTape::Instance() {
+  static TradeTape tape;
+  static const bool hook = mvd::OnResetForTests([] { tape.ResetForTests(); });
+  (void)hook;
+  return tape;
+}
+
+void TradeTape::ResetForTests() {
+  std::lock_guard lock(mu_);
+  tapes_.clear();
+  version_.store(0, std::memory_order_release);
+}
+
+bool TradeTape::StoreLocked(Tape& tape, TradeRecord&& trade) {
+  if (trade.number <= 0) return false;
+  const int page = mvd::PageOfTrade(trade.number);
+  std::unique_ptr<Block>& block = tape.blocks[page];
+  if (!block) block = std::make_unique<Block>();
+  TradeRecord& slot = block->trades[std::size_t((trade.number - 1) % mvd::kTradesPerPage)];
+  if (slot.number == 0) {
+    ++block->count;
+    ++tape.count;
+  }
+  slot = std::move(trade);
+  version_.fetch_add(1, std::memory_order_release);
+  return true;
+}
+
+int TradeTape::StorePage(const InstrumentKey& key, std::wstring_view text) {
+  // Parse outside the lock; store in one go.
+  std::vector<TradeRecord> trades;
+  mvd::ParseTradeData(text, [&](TradeRecord&& r) { trades.push_back(std::move(r)); });
+  if (trades.empty()) return 0;
+  std::lock_guard lock(mu_);
+  Tape& tape = tapes_[key];
+  int stored = 0;
+  for (TradeRecord& r : trades) stored += StoreLocked(tape, std::move(r));
+  return stored;
+}
+
+bool TradeTape::Store(const InstrumentKey& key, TradeRecord trade) {
+  if (trade.number <= 0) return false;
+  std::lock_guard lock(mu_);
+  return StoreLocked(tapes_[key], std::move(trade));
+}
+
+const TradeRecord* TradeTape::FindLocked(const InstrumentKey& key, std::int32_t number) const {
+  if (number <= 0) return nullptr;
+  const auto tape = tapes_.find(key);
+  if (tape == tapes_.end()) return nullptr;
+  const auto block = tape->second.blocks.find(mvd::PageOfTrade(number));
+  if (block == tape->second.blocks.end()) return nullptr;
+  const TradeRecord& r = block->second->trades[std::size_t((number - 1) % mvd::kTradesPerPage)];
+  return r.number == 0 ? nullptr : &r;
+}
+
+bool TradeTape::Get(const InstrumentKey& key, std::int32_t number, TradeRecord& out) const {
+  return Read(key, number, [&](const TradeRecord& r) { out = r; });
+}
+
+bool TradeTape::Has(const InstrumentKey& key, std::int32_t number) const {
+  std::lock_guard lock(mu_);
+  return FindLocked(key, number) != nullptr;
+}
+
+int TradeTape::CountInPage(const InstrumentKey& key, int page) const {
+  if (page < 1) return 0;
+  std::lock_guard lock(mu_);
+  const auto tape = tapes_.find(key);
+  if (tape == tapes_.end()) return 0;
+  const auto block = tape->second.blocks.find(page);
+  return block == tape->second.blocks.end() ? 0 : block->second->count;
+}
+
+int TradeTape::CountRange(const InstrumentKey& key, std::int32_t from, std::int32_t to) const {
+  from = std::max<std::int32_t>(from, 1);
+  if (to < from) return 0;
+  std::lock_guard lock(mu_);
+  const auto tape = tapes_.find(key);
+  if (tape == tapes_.end()) return 0;
+  int held = 0;
+  for (int page = mvd::PageOfTrade(from), lastPage = mvd::PageOfTrade(to); page <= lastPage; ++page) {
+    const auto block = tape->second.blocks.find(page);
+    if (block == tape->second.blocks.end()) continue;
+    const std::int64_t first = mvd::FirstTradeOfPage(page);
+    const std::int64_t end = first + mvd::kTradesPerPage - 1;
+    const std::int64_t lo = std::max<std::int64_t>(from, first);
+    const std::int64_t hi = std::min<std::int64_t>(to, end);
+    if (lo == first && hi == end) {
+      held += block->second->count;
+      continue;
+    }
+    for (std::int64_t n = lo; n <= hi; ++n) held += block->second->trades[std::size_t(n - first)].number != 0;
+  }
+  return held;
+}
+
+std::size_t TradeTape::Count(const InstrumentKey& key) const {
+  std::lock_guard lock(mu_);
+  const auto tape = tapes_.find(key);
+  return tape == tapes_.end() ? 0 : tape->second.count;
+}
+
+std::uint64_t TradeTape::Version() const noexcept { return version_.load(std::memory_order_acquire); }
