@@ -209,9 +209,12 @@ bool TerminalApp::Start(std::string& error) {
       params["User_field_product_id"] = std::to_wstring(o.productId);
       params["User_field_save_space"] = L"0";
     }
+    for (const auto& [key, value] : o.params) params[key] = hv::Widen(value);
     CSuperBaseView* v = OpenView(o.className, known ? o.productId : -1, known ? o.instrumentCode : std::string(),
                                  params, {}, error);
     if (!v) return false;
+    // Start parameters reach the view as a restored layout's do.
+    if (!o.params.empty()) m_runtime->DeliverStartLink(v);
     if (known) DeliverLink(v, o.productId, o.instrumentCode);
     if (!unknownInstruments[k].empty()) ReportProblem(QString::fromStdString("The " + unknownInstruments[k]) +
                                                           ". The view opened without an instrument.", true);

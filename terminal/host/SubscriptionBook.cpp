@@ -1,6 +1,7 @@
 #include "terminal/host/SubscriptionBook.h"
 
 #include <algorithm>
+#include <set>
 
 #include "hostview/MessageIds.h"
 #include "terminal/host/HostRuntime.h"

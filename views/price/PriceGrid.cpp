@@ -364,6 +364,19 @@ std::vector<InstrumentKey> PriceGrid::SelectedKeys() const {
   return keys;
 }
 
+void PriceGrid::SelectKeys(const std::vector<InstrumentKey>& keys) {
+  ClearSelection();
+  bool first = true;
+  for (const InstrumentKey& k : keys) {
+    const int row = FindRow(k);
+    if (row < 0) continue;
+    if (first) GotoCell(std::max(0, GetCurrentCol()), row);
+    else SelectRow(row, true);
+    first = false;
+  }
+  RedrawAll();
+}
+
 int PriceGrid::FindRow(const InstrumentKey& key) const {
   for (std::size_t i = 0; i < m_rows.size(); ++i)
     if (m_rows[i].key == key) return int(i);
@@ -940,12 +953,9 @@ void PriceGrid::OnRClicked(int col, int row, bool pressed, const QRect&, const Q
   ShowContextMenu(viewport()->mapToGlobal(pt));
 }
 
-int PriceGrid::CurrentListPosition() const {
-  const WatchlistStoreT* store = StoreOfKind(m_listKind);
-  return store ? store->IndexOf(m_listName) : -1;
-}
+std::vector<platform::MenuItem> PriceGrid::BuildContextMenu() const { return ContextMenuFor(m_listKind, m_listName); }
 
-std::vector<platform::MenuItem> PriceGrid::BuildContextMenu() const {
+std::vector<platform::MenuItem> PriceGrid::ContextMenuFor(int listKind, const std::wstring& listName) {
   std::vector<platform::MenuItem> items;
   auto add = [&](int id, const QString& text) {
     platform::MenuItem item;
@@ -954,7 +964,7 @@ std::vector<platform::MenuItem> PriceGrid::BuildContextMenu() const {
     items.push_back(std::move(item));
   };
   auto separator = [&] { items.push_back(platform::MenuItem{}); };
-  if (m_listKind != kWorldIndices) {
+  if (listKind != kWorldIndices) {
     add(kCmdTrade, Text(401, L"Trade"));
     separator();
     add(kCmdChart, Text(402, L"Chart"));
@@ -967,12 +977,12 @@ std::vector<platform::MenuItem> PriceGrid::BuildContextMenu() const {
     add(kCmdDepth, Text(7, L"Market Depth"));
     separator();
   }
-  if (m_listKind != kKeldoWatchlists) {
+  if (listKind != kKeldoWatchlists) {
     platform::MenuItem sub;
     sub.text = Text(403, L"Add to Watchlist");
     const auto& lists = UserWatchlistStore().Records();
     for (std::size_t i = 0; i < lists.size() && int(i) < kCommandRange; ++i) {
-      if (m_listKind == kUserWatchlists && lists[i].name == m_listName) continue;
+      if (listKind == kUserWatchlists && lists[i].name == listName) continue;
       platform::MenuItem item;
       item.id = kCmdAddToUser + int(i);
       item.text = Q(lists[i].name);
@@ -982,10 +992,11 @@ std::vector<platform::MenuItem> PriceGrid::BuildContextMenu() const {
     if (sub.children.empty()) sub.enabled = false;
     items.push_back(std::move(sub));
   }
-  const int position = CurrentListPosition();
-  if (m_listKind == kUserWatchlists && position >= 0 && position < kCommandRange)
+  const WatchlistStoreT* store = StoreOfKind(listKind);
+  const int position = store ? store->IndexOf(listName) : -1;
+  if (listKind == kUserWatchlists && position >= 0 && position < kCommandRange)
     add(kCmdRemoveFromUser + position, Text(404, L"Remove from this Watchlist"));
-  if (m_listKind == kKeldoWatchlists && position >= 0 && position < kCommandRange)
+  if (listKind == kKeldoWatchlists && position >= 0 && position < kCommandRange)
     add(kCmdRemoveFromKeldo + position, QStringLiteral("Remove From KELDO Watchlist"));
   // No trailing separator.
   while (!items.empty() && items.back().id == 0 && items.back().text.isEmpty()) items.pop_back();
@@ -1009,10 +1020,21 @@ std::wstring PriceGrid::LinkTextFor(const Row& row) const {
 void PriceGrid::RunCommand(int command) {
   const std::vector<int> selected = GetSelectedRows();
   if (selected.empty()) return;
-  const auto& msg = addon::Msg();
   const Row& first = m_rows[std::size_t(selected.front())];
+  std::vector<InstrumentKey> keys;
+  for (int r : selected) keys.push_back(m_rows[std::size_t(r)].key);
+  RunMenuCommand(Owner(), command, keys, LinkTextFor(first), first.known && IsTradeableStatus(first.accessStatus));
+}
+
+void PriceGrid::RunMenuCommand(CSuperBaseView* owner, int command, const std::vector<InstrumentKey>& keys,
+                               const std::wstring& firstLinkText, bool firstTradeable) {
+  if (keys.empty()) return;
+  const auto& msg = addon::Msg();
+  auto send = [owner](UINT message, WPARAM wParam, LPARAM lParam) {
+    platform::SendMessage(owner, message, wParam, lParam);
+  };
   if (command >= kCmdTrade && command <= kCmdNews) {
-    const std::wstring text = LinkTextFor(first);
+    const std::wstring& text = firstLinkText;
     UINT message = 0;
     switch (command) {
       case kCmdTrade: message = msg.wlOpenTrade; break;
@@ -1026,18 +1048,16 @@ void PriceGrid::RunCommand(int command) {
       default: return;
     }
     LPARAM second = 0;
-    if (command == kCmdTrade && !(first.known && IsTradeableStatus(first.accessStatus))) second = -1;
-    SendToOwner(message, ToLParam(&text), second);
+    if (command == kCmdTrade && !firstTradeable) second = -1;
+    send(message, ToLParam(&text), second);
     return;
   }
-  std::vector<InstrumentKey> keys;
-  for (int r : selected) keys.push_back(m_rows[std::size_t(r)].key);
   auto inRange = [&](int base) { return command >= base && command < base + kCommandRange; };
-  if (inRange(kCmdAddToUser)) SendToOwner(msg.wlAddInsList, ToLParam(&keys), command - kCmdAddToUser);
-  else if (inRange(kCmdRemoveFromUser)) SendToOwner(msg.wlRemoveInsList, ToLParam(&keys), command - kCmdRemoveFromUser);
-  else if (inRange(kCmdAddToKeldo)) SendToOwner(msg.keldoWlAddInsList, ToLParam(&keys), command - kCmdAddToKeldo);
+  if (inRange(kCmdAddToUser)) send(msg.wlAddInsList, ToLParam(&keys), command - kCmdAddToUser);
+  else if (inRange(kCmdRemoveFromUser)) send(msg.wlRemoveInsList, ToLParam(&keys), command - kCmdRemoveFromUser);
+  else if (inRange(kCmdAddToKeldo)) send(msg.keldoWlAddInsList, ToLParam(&keys), command - kCmdAddToKeldo);
   else if (inRange(kCmdRemoveFromKeldo))
-    SendToOwner(msg.keldoWlRemoveInsList, ToLParam(&keys), command - kCmdRemoveFromKeldo);
+    send(msg.keldoWlRemoveInsList, ToLParam(&keys), command - kCmdRemoveFromKeldo);
 }
 
 // ---- Row moves ------------------------------------------------------------------------------------

@@ -91,6 +91,7 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   // The rows in display order.
   std::vector<InstrumentKey> Rows() const override;
   std::vector<InstrumentKey> SelectedKeys() const override;
+  void SelectKeys(const std::vector<InstrumentKey>& keys) override;
   int RowCount() const override { return int(m_rows.size()); }
   const InstrumentKey& RowKey(int row) const { return m_rows[std::size_t(row)].key; }
   int FindRow(const InstrumentKey& key) const;
@@ -147,6 +148,12 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   void ShowContextMenu(const QPoint& globalPos);
   std::vector<platform::MenuItem> BuildContextMenu() const;
   void RunCommand(int command);
+  // The same menu for any quote grid (the board offers it too): for the rows
+  // of the list `listName` of a family, and the commands run for `keys` (the
+  // first key opens views and tickets with its link text).
+  static std::vector<platform::MenuItem> ContextMenuFor(int listKind, const std::wstring& listName);
+  static void RunMenuCommand(CSuperBaseView* owner, int command, const std::vector<InstrumentKey>& keys,
+                             const std::wstring& firstLinkText, bool firstTradeable);
 
  protected:
   void OnGetCell(int col, int row, CGridCell& cell) override;
@@ -192,7 +199,6 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   void SendToOwner(UINT message, WPARAM wParam, LPARAM lParam);
   void PaintGridLines(QPainter& p, const QRect& clip);
   std::wstring LinkTextFor(const Row& row) const;
-  int CurrentListPosition() const;
 
   CSuperBaseView* m_owner = nullptr;
   int m_listKind = 0;

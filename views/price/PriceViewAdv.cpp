@@ -28,6 +28,8 @@
 #include "hostview/StyleRoles.h"
 #include "hostview/Text.h"
 #include "platform/Platform.h"
+#include "views/price/AdvanceFilter.h"
+#include "views/price/BoardGrid.h"
 #include "views/price/PriceColumns.h"
 #include "views/price/PriceGrid.h"
 #include "views/price/TipDialogs.h"
@@ -177,6 +179,11 @@ QWidget* CPriceViewAdv::Control(int id) const {
     case kExplorerButtonId: return m_explorerButton;
     case kTop30MenuButtonId: return m_top30MenuButton;
     case kHelpButtonId: return m_helpButton;
+    case CAdvanceFilter::kProductListId:
+    case CAdvanceFilter::kExchangeListId:
+    case CAdvanceFilter::kSectorListId:
+    case CAdvanceFilter::kLetterListId:
+      return m_filter ? static_cast<QWidget*>(m_filter->List(id)) : nullptr;
     default: return nullptr;
   }
 }
@@ -223,8 +230,10 @@ void CPriceViewAdv::BuildControls() {
     connect(b, &CHostButton::commandClicked, this, [this](int id) { OnCommand(id); });
     m_familyButtons[f.kind] = b;
   }
-  // The advance filter arrives with its own lists; until then its button stays hidden.
-  m_familyButtons[kAdvanceFilter]->hide();
+  m_filter = new CAdvanceFilter(this);
+  m_filter->SetStyleManager(m_pStyleManager);
+  m_filter->onResult = [this](const std::vector<InstrumentKey>& result) { OnFilterResult(result); };
+  m_filter->hide();
 
   m_combo = new CInstrumentComboBox(this);
   m_combo->setObjectName(QStringLiteral("InstrumentBox"));
@@ -259,6 +268,12 @@ void CPriceViewAdv::BuildControls() {
   m_priceGrid->SetStyleManager(m_pStyleManager);
   m_priceGrid->hide();
   m_grids[kListMode] = m_priceGrid;
+  m_boardGrid = new BoardGrid(this);
+  m_boardGrid->setObjectName(QStringLiteral("BoardGrid"));
+  m_boardGrid->SetOwner(this);
+  m_boardGrid->SetStyleManager(m_pStyleManager);
+  m_boardGrid->hide();
+  m_grids[kBoardMode] = m_boardGrid;
 
   m_lsTip = new CLSTipDlg(this);
   m_remTip = new CRemTipDlg(this);
@@ -275,6 +290,8 @@ void CPriceViewAdv::BuildControls() {
   WatchTradeKeys(this);
   WatchTradeKeys(m_priceGrid);
   WatchTradeKeys(m_priceGrid->viewport());
+  WatchTradeKeys(m_boardGrid);
+  WatchTradeKeys(m_boardGrid->viewport());
   WatchTradeKeys(m_combo, true);
   if (m_combo->lineEdit()) WatchTradeKeys(m_combo->lineEdit(), true);
   // The wheel gives the focus to the grid first.
@@ -313,6 +330,7 @@ void CPriceViewAdv::SetStyleManager(IStyleManager* styleManager) {
   for (CBranticButton* b : m_familyButtons)
     if (b) b->SetStyleManager(styleManager);
   if (m_combo) m_combo->SetStyleManager(styleManager);
+  if (m_filter) m_filter->SetStyleManager(styleManager);
   for (CHostButton* b : std::initializer_list<CHostButton*>{m_listModeButton, m_boardModeButton, m_explorerButton,
                                                            m_helpButton, m_top30MenuButton})
     if (b) b->SetStyleManager(styleManager);
@@ -375,6 +393,7 @@ void CPriceViewAdv::OnActivate() {
     LoadKELDOWatchlistTabs();
     for (bool& stale : m_tabsStale) stale = false;
     if (m_listKind == kUserWatchlists) ShowWatchlist(kUserWatchlists, m_currentUser);
+    RestorePendingFilter();
   } else {
     // Lists that changed while another view had the focus.
     for (int family = 0; family < 3; ++family)
@@ -464,6 +483,11 @@ void CPriceViewAdv::Relayout() {
     if (top30) m_top30MenuButton->setGeometry(w - menuWidth, top, menuWidth, kTabHeight);
     top += kTabHeight;
   }
+  if (m_filter) m_filter->setVisible(m_listKind == kAdvanceFilter);
+  if (m_filter && m_listKind == kAdvanceFilter) {
+    m_filter->setGeometry(0, top, w, CAdvanceFilter::BarHeight());
+    top += CAdvanceFilter::BarHeight();
+  }
   for (int mode = 0; mode < 2; ++mode) {
     IQuoteGrid* g = m_grids[mode];
     if (!g) continue;
@@ -552,6 +576,12 @@ std::uint32_t CPriceViewAdv::OnViewMessage(UINT message, LPARAM data) {
     case hm::FontSizeMenu:
       ShowFontSizeMenu();
       return 0;
+    case hm::Sectors:
+      if (data && m_filter) {
+        m_filter->SetSectors(*FromLParam<const std::vector<JSector>>(data));
+        RestorePendingFilter();
+      }
+      return 0;
     case hm::SettingsChanged:
       for (IQuoteGrid* g : m_grids)
         if (g) g->ApplyColumns();
@@ -636,12 +666,51 @@ void CPriceViewAdv::ApplyStartParams(const std::wstring& linkText) {
   const std::string mode = link->Get(addon::linkkey::kUserDisplayMode);
   if (mode == "Board" && m_grids[kBoardMode]) SetDisplayMode(kBoardMode);
   else if (mode == "List") SetDisplayMode(kListMode);
+  m_pendingFilter = link->Get(kAdvanceFilterParam);
+  if (!m_firstActivation) RestorePendingFilter();
 }
 
 void CPriceViewAdv::StoreStartParams() {
   StartParamMap params = GetStartParams();
   params[addon::linkkey::kUserDisplayMode] = m_displayMode == kBoardMode ? L"Board" : L"List";
+  const auto choice = m_filter && m_listKind == kAdvanceFilter ? m_filter->CurrentChoice() : std::nullopt;
+  if (choice) params[kAdvanceFilterParam] = hv::Widen(CAdvanceFilter::ChoiceText(*choice));
+  else params.erase(kAdvanceFilterParam);
   SetStartParam(-1, std::string(), params);
+}
+
+// ---- Advance filter ----------------------------------------------------------------------------------
+
+void CPriceViewAdv::OpenAdvanceFilter() {
+  m_filter->Reset();
+  // The sectors come with 2800; the terminal answers at once.
+  if (!m_filter->HasSectors()) SendChildFeedback(hm::Sectors, 0);
+}
+
+void CPriceViewAdv::OnFilterResult(const std::vector<InstrumentKey>& result) {
+  if (m_listKind != kAdvanceFilter) return;
+  if (IQuoteGrid* grid = VisibleGrid()) grid->LoadItems(kAdvanceFilter, std::wstring(), result);
+  UpdateEmptyText();
+  StoreStartParams();
+}
+
+void CPriceViewAdv::RestorePendingFilter() {
+  if (m_pendingFilter.empty() || !m_filter || m_firstActivation) return;
+  const auto choice = CAdvanceFilter::ParseChoice(m_pendingFilter);
+  if (!choice) {
+    m_pendingFilter.clear();
+    return;
+  }
+  if (m_listKind != kAdvanceFilter) SwitchFamily(kAdvanceFilter);
+  // A sector other than "ALL" waits for the terminal's sectors.
+  if (!m_filter->HasSectors() && choice->sector != CAdvanceFilter::kAllSectorsValue) return;
+  m_pendingFilter.clear();
+  if (m_filter->Restore(*choice)) return;
+  // A choice the lists no longer offer: an empty filter to choose again.
+  for (IQuoteGrid* g : m_grids)
+    if (g) g->LoadItems(kAdvanceFilter, std::wstring(), {});
+  UpdateEmptyText();
+  StoreStartParams();
 }
 
 // ---- Tabs ----------------------------------------------------------------------------------------------
@@ -776,8 +845,10 @@ void CPriceViewAdv::OnCommand(int id) {
 
 void CPriceViewAdv::SwitchFamily(int listKind) {
   if (listKind < kUserWatchlists || listKind > kAdvanceFilter) return;
+  const bool leavingFilter = m_listKind == kAdvanceFilter && listKind != kAdvanceFilter;
   m_listKind = listKind;
   PressFamilyButton();
+  if (leavingFilter) StoreStartParams();
   Relayout();
   switch (listKind) {
     case kUserWatchlists:
@@ -800,7 +871,9 @@ void CPriceViewAdv::SwitchFamily(int listKind) {
     default:
       for (IQuoteGrid* g : m_grids)
         if (g) g->LoadItems(kAdvanceFilter, std::wstring(), {});
+      OpenAdvanceFilter();
       UpdateEmptyText();
+      StoreStartParams();
       return;
   }
 }
@@ -813,8 +886,12 @@ void CPriceViewAdv::SetDisplayMode(int mode) {
   IQuoteGrid* other = m_grids[mode == kListMode ? kBoardMode : kListMode];
   if (other) other->Widget()->hide();
   if (shown) {
+    const std::vector<InstrumentKey> selected = other ? other->SelectedKeys() : std::vector<InstrumentKey>{};
     const std::wstring& name = m_listKind == kWorldIndices ? std::wstring(watchlist::kWorldIndexName) : CurrentName(m_listKind);
-    shown->LoadWatchlist(m_listKind, name);
+    // A list without a store (the advance filter's) goes over as it is.
+    if (StoreOfKind(m_listKind)) shown->LoadWatchlist(m_listKind, name);
+    else shown->LoadItems(m_listKind, name, other ? other->Rows() : std::vector<InstrumentKey>{});
+    shown->SelectKeys(selected);
     shown->Widget()->show();
   }
   UpdateEmptyText();
@@ -856,6 +933,9 @@ void CPriceViewAdv::UpdateEmptyText() {
           text = FormatText(addon::LanguageTextTable::Instance().Get(416), m_currentTop30);
           break;
         case kKeldoWatchlists: text = addon::LanguageTextTable::Instance().Get(417); break;
+        case kAdvanceFilter:
+          text = m_filter && m_filter->CurrentChoice() ? kFilterNoMatchText : kFilterChooseText;
+          break;
         default: break;
       }
     }
@@ -1183,6 +1263,13 @@ std::optional<std::wstring> CPriceViewAdv::ShortcutTicket(addon::TradeSide side)
   if (selected.empty()) return std::nullopt;
   const InstrumentKey& k = selected.front();
   addon::LinkTextBuilder text = addon::ShortcutTicketText(hv::Narrow(k.InstrumentCode), k.ProductID, side);
+  // On the board the tile's quantity goes with the ticket, once it passes its check.
+  if (grid == m_boardGrid) {
+    const auto quantity =
+        m_boardGrid->CheckQuantity(m_boardGrid->SelectedTile(), side == addon::TradeSide::Buy ? 1 : 2);
+    if (!quantity) return std::nullopt;
+    text.Add(addon::linkkey::kQty, std::to_string(*quantity));
+  }
   // The row's price goes with the ticket only when it is above 0.
   QuoteRecord quote;
   if (QuoteStore::Instance().Peek(k, quote)) {

@@ -34,6 +34,8 @@
 #include "hostview/HostLists.h"
 #include "hostview/Records.h"
 
+class BoardGrid;
+class CAdvanceFilter;
 class CBranticButton;
 class CCustomTabCtrl;
 class CImageButton;
@@ -80,6 +82,11 @@ class CPriceViewAdv : public CAddonView {
   static constexpr const wchar_t* kAlreadyInList = L"Instrument already exist in the list.";
   static constexpr const wchar_t* kRemoved = L"Instrument successfully removed from the list.";
   static constexpr const wchar_t* kHelpTip = L"Price delayed 15-30mins for counters with *.";
+  // The advance filter's empty-list texts (before a full choice / no match).
+  static constexpr const wchar_t* kFilterChooseText = L"Choose a product, an exchange, a sector and a letter.";
+  static constexpr const wchar_t* kFilterNoMatchText = L"No instrument matches the filter.";
+  // Start parameter: the advance filter's choices while it is on screen.
+  static constexpr const char* kAdvanceFilterParam = "User_field_advance_filter";
 
   CPriceViewAdv();
   ~CPriceViewAdv() override;
@@ -99,6 +106,8 @@ class CPriceViewAdv : public CAddonView {
   const std::wstring& CurrentName(int listKind) const;
   IQuoteGrid* VisibleGrid() const;
   PriceGrid* GetPriceGrid() const { return m_priceGrid; }
+  BoardGrid* GetBoardGrid() const { return m_boardGrid; }
+  CAdvanceFilter* AdvanceFilter() const { return m_filter; }
   CCustomTabCtrl* Tabs(int listKind) const;
   CInstrumentComboBox* InstrumentBox() const { return m_combo; }
   CLSTipDlg* LongShortLegend() const { return m_lsTip; }
@@ -172,6 +181,10 @@ class CPriceViewAdv : public CAddonView {
   void UpdateEmptyText();
   void StoreStartParams();
   void ApplyStartParams(const std::wstring& linkText);
+  // The advance filter: the family button, a result, a choice to restore.
+  void OpenAdvanceFilter();
+  void OnFilterResult(const std::vector<InstrumentKey>& result);
+  void RestorePendingFilter();
 
   // Host replies.
   void OnFieldUpdate(const FieldUpdate& update);
@@ -229,6 +242,9 @@ class CPriceViewAdv : public CAddonView {
   CBranticButton* m_top30MenuButton = nullptr;
   CImageButton* m_helpButton = nullptr;
   PriceGrid* m_priceGrid = nullptr;
+  BoardGrid* m_boardGrid = nullptr;
+  CAdvanceFilter* m_filter = nullptr;
+  std::string m_pendingFilter;  // choices of a start parameter, made once the view can
   IQuoteGrid* m_grids[2] = {nullptr, nullptr};  // by display mode; the board slots in at 1
   CLSTipDlg* m_lsTip = nullptr;
   CRemTipDlg* m_remTip = nullptr;

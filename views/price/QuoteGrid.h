@@ -29,6 +29,9 @@ class IQuoteGrid {
   virtual std::vector<InstrumentKey> Rows() const = 0;
   // Rows the user selected, in display order.
   virtual std::vector<InstrumentKey> SelectedKeys() const = 0;
+  // Selects the shown ones of `keys` (the first is scrolled into view); the
+  // selection the other grid had when the display mode changes.
+  virtual void SelectKeys(const std::vector<InstrumentKey>& keys) = 0;
   // The texts of 612 and 618 from the rows in display order.
   virtual std::wstring UserItemText() const = 0;
   virtual std::wstring KeldoItemText() const = 0;

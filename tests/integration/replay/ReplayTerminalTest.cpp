@@ -70,12 +70,12 @@ struct ViewCase {
   bool onInstrument;
 };
 
-// One line per view that dumps a grid (the price view joins with
-// {"CPriceViewAdv", false} and the trade summary with {"CTradeSummaryAdv", true}
-// once they dump theirs).
+// One line per view that dumps a grid.
 const ViewCase kViews[] = {
     {"CMarketDepthAdv", true},
     {"CTimeAndSalesAdv", true},
+    {"CPriceViewAdv", false},
+    {"CTradeSummaryAdv", true},
 };
 
 QStringList OpenArgs(const std::vector<ViewCase>& views) {
@@ -90,7 +90,7 @@ QStringList OpenArgs(const std::vector<ViewCase>& views) {
 std::map<QString, QByteArray> DumpFiles(const QString& dir) {
   std::map<QString, QByteArray> out;
   for (const QFileInfo& f : QDir(dir).entryInfoList(QDir::Files)) {
-    if (f.fileName().startsWith("market-")) continue;
+    if (f.fileName().startsWith("market-")) continue;  // the simulator's files, not a view's
     QFile file(f.filePath());
     if (file.open(QIODevice::ReadOnly)) out[f.fileName()] = file.readAll();
   }

@@ -673,16 +673,6 @@ TEST_F(PriceView, FontSizeMenu_StoresTheChoiceAndAnnouncesIt) {
   EXPECT_EQ(other->GetPriceGrid()->GetDefFont().pointSize(), CWatchlistSetting::FontPointSize(3));
 }
 
-TEST_F(PriceView, DisplayMode_WithoutABoardTheListStaysAndIsSavedAsList) {
-  CPriceViewAdv* view = Make();
-  EXPECT_TRUE(view->Control(CPriceViewAdv::kBoardModeButtonId)->isHidden());
-  view->OnCommand(CPriceViewAdv::kBoardModeButtonId);
-  EXPECT_EQ(view->GetDisplayMode(), CPriceViewAdv::kListMode);
-  view->OnCommand(CPriceViewAdv::kListModeButtonId);
-  EXPECT_EQ(view->GetStartParams().at("User_field_display_mode"), L"List");
-  EXPECT_EQ(Codes(view->GetPriceGrid()).size(), 3u);
-}
-
 TEST_F(PriceView, Legends_OpenHalfASecondAfterTheGridsMessage) {
   CPriceViewAdv* view = Make();
   const std::vector<JRemarkMessage> remarks{{"HKEX", "XX", "Other"}, {"SGX", "CD", "Cum dividend"}, {"SGX", "XD", "Ex"}};
