@@ -39,11 +39,11 @@ const Entry kSection13[] = {
     // Board tile captions.
     {201, L"Bid"}, {202, L"Ask"}, {203, L"Vol"}, {204, L"Chg"}, {205, L"Delay"},
     // Price grid menu and watchlists.
-    {401, L"Buy"}, {402, L"Sell"}, {403, L"Add to Watchlist"}, {404, L"Remove from this Watchlist"},
+    {401, L"Trade"}, {402, L"Chart"}, {403, L"Add to Watchlist"}, {404, L"Remove from this Watchlist"},
     {407, L"Delete this watchlist?"}, {408, L"The watchlist name cannot be empty."},
     {409, L"already exists. Please choose another name."}, {410, L"Rename"}, {411, L"Delete"},
     {412, L"Remove from this list"}, {413, L"This watchlist is empty. Add instruments with the search box above."},
-    {414, L"Chart"}, {415, L"Stock Analytics"},
+    {414, L"Price Alert"}, {415, L"Stock Analytics"},
     {416, L"%s has no instruments at the moment."}, {417, L"This list is empty."},
     {418, L"Related News"}, {419, L"Double-click for the legend"},
     // Depth.
