@@ -3,6 +3,11 @@
 // static model holding the same texts. Ends with "RATIO grid_paint <r>"
 // (engine time / QTableView time; below 1 means the engine is faster).
 //
+// The price view's board repainting a full 1920x1080 board after every tile's
+// quote changed, against the price view's list grid repainting the same
+// instruments after the same changes: "RATIO board_paint <r>" (board time /
+// list time; tiles draw more than rows, so somewhat above 1 is expected).
+//
 // The time-and-sales grid painting its visible rows after scrolling to the
 // middle of a 99,900-trade tape, against the same grid over a 100-trade tape:
 // "RATIO tape_scroll <r>" (about 1 when the cost does not grow with the tape).
@@ -24,10 +29,16 @@
 #include <vector>
 
 #include "data/MarketStores.h"
+#include "data/QuoteStore.h"
+#include "data/ReferenceStores.h"
 #include "data/TradeTape.h"
 #include "grid/GridCtrl.h"
+#include "platform/Platform.h"
 #include "views/instrument/SalesFeed.h"
 #include "views/instrument/TimeASGrid.h"
+#include "views/price/BoardGrid.h"
+#include "views/price/PriceGrid.h"
+#include "views/price/Watchlists.h"
 
 namespace {
 
@@ -131,6 +142,85 @@ void BM_QTableViewPaint(benchmark::State& state) {
 BENCHMARK(BM_GridEnginePaint)->Unit(benchmark::kMillisecond)->MinTime(1.0);
 BENCHMARK(BM_QTableViewPaint)->Unit(benchmark::kMillisecond)->MinTime(1.0);
 
+// ---- board against list -------------------------------------------------------
+
+constexpr int kBoardInstruments = 64;  // 8 columns x 8 rows of tiles fill 1920x1080
+
+struct QuoteBoardFixture {
+  std::vector<JInstrumentUnderlying> instruments;
+  std::vector<InstrumentKey> keys;
+  BoardGrid board;
+  PriceGrid list;
+  QImage image{kWidth, kHeight, QImage::Format_ARGB32_Premultiplied};
+  int step = 0;
+  QuoteBoardFixture() {
+    for (int n = 0; n < kBoardInstruments; ++n) {
+      JInstrumentUnderlying i;
+      i.productId = 101;
+      i.instrumentCode = "B" + std::to_string(100 + n);
+      i.symbol = i.displayCode = i.instrumentCode;
+      i.instrumentName = "Board Instrument " + std::to_string(n) + " Holdings";
+      i.exchangeCode = "SGX";
+      i.decimals = 3;
+      i.lotSize = 100;
+      i.productType = "ES";
+      instruments.push_back(i);
+      keys.push_back(InstrumentKeyOf(i));
+    }
+    InstrumentMgr_ReadOnly().Fill(&instruments);
+    for (CGridCtrl* g : {static_cast<CGridCtrl*>(&board), static_cast<CGridCtrl*>(&list)}) {
+      g->resize(kWidth, kHeight);
+      g->show();
+    }
+    board.LoadItems(kUserWatchlists, L"Bench", keys);
+    list.LoadItems(kUserWatchlists, L"Bench", keys);
+    ChangeEveryQuote();
+  }
+  // New last, change, bid, ask, volumes for every instrument (marks up or down).
+  void ChangeEveryQuote() {
+    ++step;
+    QuoteStore& store = QuoteStore::Instance();
+    const std::uint32_t now = platform::TickCount();
+    for (int n = 0; n < kBoardInstruments; ++n) {
+      const double last = 10.0 + n * 0.25 + ((step + n) % 2 ? 0.005 : -0.005) * (step % 7);
+      const auto& key = keys[std::size_t(n)];
+      store.Update(key, L"LAST", std::to_wstring(last), now);
+      store.Update(key, L"CHANGE", std::to_wstring(last - 10.0 - n * 0.25), now);
+      store.Update(key, L"PCHANGE", std::to_wstring((last - 10.0 - n * 0.25) / 10.0 * 100), now);
+      store.Update(key, L"BID", std::to_wstring(last - 0.005), now);
+      store.Update(key, L"ASK", std::to_wstring(last + 0.005), now);
+      store.Update(key, L"BVOL", std::to_wstring(1000 * (1 + (step + n) % 9)), now);
+      store.Update(key, L"SVOL", std::to_wstring(1000 * (1 + (step + 2 * n) % 9)), now);
+      store.Update(key, L"VOL", std::to_wstring(100000 + step * 100 + n), now);
+      store.Update(key, L"HIGH", std::to_wstring(last + 0.1), now);
+      store.Update(key, L"LOW", std::to_wstring(last - 0.1), now);
+    }
+  }
+};
+
+std::unique_ptr<QuoteBoardFixture> g_board;
+QuoteBoardFixture& B() {
+  if (!g_board) g_board = std::make_unique<QuoteBoardFixture>();
+  return *g_board;
+}
+
+template <class Grid>
+void PaintAfterChange(benchmark::State& state, Grid& grid) {
+  auto& f = B();
+  for (auto _ : state) {
+    state.PauseTiming();
+    f.ChangeEveryQuote();
+    state.ResumeTiming();
+    // What the view's timer does: the counter, then one full repaint.
+    grid.UpdateCounter();
+    QPainter p(&f.image);
+    grid.render(&p);
+    p.end();
+    benchmark::DoNotOptimize(f.image.constBits());
+  }
+  state.SetItemsProcessed(state.iterations());
+}
+
 // ---- trade tape ----------------------------------------------------------------
 
 constexpr int kLongTape = 99900;  // 999 full pages
@@ -200,6 +290,12 @@ void PaintTape(benchmark::State& state, TimeASGrid& grid, int expectedRows) {
   state.SetItemsProcessed(state.iterations());
 }
 
+void BM_BoardPaint(benchmark::State& state) { PaintAfterChange(state, B().board); }
+void BM_ListPaintSameInstruments(benchmark::State& state) { PaintAfterChange(state, B().list); }
+
+BENCHMARK(BM_BoardPaint)->Unit(benchmark::kMillisecond)->MinTime(1.0);
+BENCHMARK(BM_ListPaintSameInstruments)->Unit(benchmark::kMillisecond)->MinTime(1.0);
+
 void BM_TapeScrollLong(benchmark::State& state) { PaintTape(state, T().longGrid, kLongTape); }
 void BM_TapeScrollShort(benchmark::State& state) { PaintTape(state, T().shortGrid, kShortTape); }
 
@@ -235,6 +331,13 @@ int main(int argc, char** argv) {
     std::printf("grid engine full repaint: %.3f ms CPU, QTableView: %.3f ms CPU\n", engine->second / 1e6, table->second / 1e6);
     std::printf("RATIO grid_paint %.3f\n", engine->second / table->second);
   }
+  auto boardPaint = t.find("BM_BoardPaint");
+  auto listPaint = t.find("BM_ListPaintSameInstruments");
+  if (boardPaint != t.end() && listPaint != t.end() && listPaint->second > 0) {
+    std::printf("repaint after every quote changed: board of %d tiles %.3f ms CPU, list %.3f ms CPU\n",
+                kBoardInstruments, boardPaint->second / 1e6, listPaint->second / 1e6);
+    std::printf("RATIO board_paint %.3f\n", boardPaint->second / listPaint->second);
+  }
   auto longTape = t.find("BM_TapeScrollLong");
   auto shortTape = t.find("BM_TapeScrollShort");
   if (longTape != t.end() && shortTape != t.end() && shortTape->second > 0) {
@@ -243,6 +346,7 @@ int main(int argc, char** argv) {
     std::printf("RATIO tape_scroll %.3f\n", longTape->second / shortTape->second);
   }
   std::fflush(stdout);
+  g_board.reset();
   g_tape.reset();
   g_fixture.reset();
   benchmark::Shutdown();

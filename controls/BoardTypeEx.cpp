@@ -49,6 +49,29 @@ QColor Mix(const QColor& a, const QColor& b, double t) {
 
 }  // namespace
 
+QString PBoardTypeEx::VolumeText(const QuoteCell& cell) { return TileVolume(cell); }
+
+QString PBoardTypeEx::ChangeText(const QuoteCell& change) {
+  QString text = Q(change.text);
+  if (change.value > 0 && !text.isEmpty() && !text.startsWith(QLatin1Char('+'))) text.prepend(QLatin1Char('+'));
+  return text;
+}
+
+QString PBoardTypeEx::PercentText(const QuoteCell& percent) {
+  QString text = Q(percent.text);
+  if (text.isEmpty()) return text;
+  if (percent.value > 0 && !text.startsWith(QLatin1Char('+'))) text.prepend(QLatin1Char('+'));
+  return text + QLatin1Char('%');
+}
+
+QString PBoardTypeEx::NameText(const JInstrumentUnderlying& instrument) {
+  return Q(hv::Widen(instrument.instrumentName)).trimmed();
+}
+
+QString PBoardTypeEx::CodeText(const JInstrumentUnderlying& instrument) {
+  return Q(hv::Widen(instrument.displayCode.empty() ? instrument.symbol : instrument.displayCode)).trimmed();
+}
+
 PBoardTypeEx::PBoardTypeEx(CGridCtrl* grid) : CGridDropListType(grid), m_companyInfo(kCompanyInfoPicture) {}
 
 PBoardTypeEx::~PBoardTypeEx() = default;
@@ -90,6 +113,14 @@ PBoardTypeEx::Area PBoardTypeEx::HitArea(const QRect& cell, const QPoint& pt) {
   return kNone;
 }
 
+PBoardTypeEx::Area PBoardTypeEx::TileArea(int col, int row, const QRect& rect, const QPoint& pt) const {
+  const Area area = HitArea(rect, pt);
+  if (area != kTitleButton || !m_grid || col < 0 || row < 0) return area;
+  CGridCell cell;
+  m_grid->GetCell(col, row, cell);
+  return cell.flags & kFlagFixedTile ? kTitleStrip : area;
+}
+
 QRect PBoardTypeEx::EditRect(int, int, const QRect& cellRect) { return AreaBox(cellRect, kQtyField).ToRect(); }
 
 QString PBoardTypeEx::Caption(int id) const {
@@ -124,7 +155,7 @@ bool PBoardTypeEx::OnLClicked(int col, int row, bool pressed, const QRect& rect,
   if (!pressed) {
     const int state = m_state;
     const bool same = col == m_pressCol && row == m_pressRow && col >= 0 && row >= 0;
-    const Area area = same ? HitArea(rect, pt) : kNone;
+    const Area area = same ? TileArea(col, row, rect, pt) : kNone;
     const int pc = m_pressCol, pr = m_pressRow;
     ClearPress();
     if (same && state == 1 && area == kSecondButton) Notify(pc, pr, kCodeSecondButton, 0);
@@ -132,7 +163,7 @@ bool PBoardTypeEx::OnLClicked(int col, int row, bool pressed, const QRect& rect,
     else if (same && state == 3 && area == kQtyField) m_grid->StartEdit(pc, pr);
     return true;
   }
-  const Area area = HitArea(rect, pt);
+  const Area area = TileArea(col, row, rect, pt);
   m_lastPress = area;
   switch (area) {
     case kQtyListButton: {
@@ -176,7 +207,7 @@ bool PBoardTypeEx::OnLClicked(int col, int row, bool pressed, const QRect& rect,
 }
 
 bool PBoardTypeEx::OnDClicked(int col, int row, const QRect& rect, const QPoint& pt) {
-  const Area area = HitArea(rect, pt);
+  const Area area = TileArea(col, row, rect, pt);
   // Double clicks on the buttons and the quantity are their own business.
   if (area == kTitleButton || area == kSecondButton || area == kQtyField || area == kQtyListButton) return true;
   m_lastPress = area;
@@ -193,7 +224,7 @@ bool PBoardTypeEx::OnRClicked(int col, int row, bool pressed, const QRect& rect,
 }
 
 void PBoardTypeEx::OnMouseMove(int col, int row, const QRect& rect, const QPoint& pt) {
-  const Area area = col >= 0 && row >= 0 ? HitArea(rect, pt) : kNone;
+  const Area area = col >= 0 && row >= 0 ? TileArea(col, row, rect, pt) : kNone;
   const bool active = area == kTitleButton || area == kSecondButton || area == kQtyField || area == kQtyListButton ||
                       area == kBidBox || area == kAskBox;
   if (m_grid && col >= 0) m_grid->SetGridCursor(active ? Qt::PointingHandCursor : Qt::ArrowCursor);
@@ -237,7 +268,7 @@ QString PBoardTypeEx::MarketDelay(std::int64_t productId, const std::string& exc
 void PBoardTypeEx::OnDraw(QPainter& p, const QRect& rect, int col, int row, const CGridCell& cell, bool selected,
                           bool current) {
   std::lock_guard<std::mutex> guard(TileLock());
-  DrawTile(p, rect, cell, selected);
+  DrawTile(p, rect, cell, selected || (cell.flags & kFlagSelectedTile));
 }
 
 void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cell, bool selected) {
@@ -268,7 +299,14 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
   const QColor head = style ? style->Color(skin::kHeadBack) : QColor(44, 82, 140);
   const QColor headText = style ? style->Color(skin::kHeadText) : QColor(255, 255, 255);
   const QColor muted = Mix(text, body, 0.45);
-  const QColor up(0, 150, 0), down(250, 0, 0);
+  // Rise and fall, and a fresh change, in the colours the quote table uses.
+  const QColor up = style ? style->Color(kStyleRise) : QColor(0, 150, 0);
+  const QColor down = style ? style->Color(kStyleFall) : QColor(250, 0, 0);
+  const QColor flashText = style ? style->Color(kStyleChangedText) : QColor(20, 20, 20);
+  const QColor riseBack = style ? style->Color(kStyleRiseBack) : QColor(214, 245, 214);
+  const QColor fallBack = style ? style->Color(kStyleFallBack) : QColor(252, 218, 218);
+  const QColor editBack = style ? style->Color(skin::kEditBack) : QColor(255, 255, 255);
+  const QColor editText = style ? style->Color(skin::kEditText) : QColor(20, 20, 20);
   const QColor bidTint(38, 110, 200), askTint(210, 60, 50);
 
   QFont base = m_grid ? m_grid->GetDefFont() : QFont();
@@ -324,7 +362,8 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
     x = badge.right() + 5;
   }
   const Box tb = AreaBox(rect, kTitleButton);
-  int nameRight = tb.l - 4;
+  const bool removable = !(cell.flags & kFlagFixedTile);
+  int nameRight = removable ? tb.l - 4 : title.right() - 3;
   {
     // The market delay, when there is one, sits before the remove button.
     const QString delay = MarketDelay(ins.productId, ins.exchangeCode);
@@ -348,8 +387,8 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
   p.setPen(headText);
   const QRect nameRect(x, title.top(), nameRight - x, title.height());
   p.drawText(nameRect, Qt::AlignVCenter | Qt::AlignLeft,
-             p.fontMetrics().elidedText(Q(hv::Widen(ins.instrumentName)).trimmed(), Qt::ElideRight, nameRect.width()));
-  {
+             p.fontMetrics().elidedText(NameText(ins), Qt::ElideRight, nameRect.width()));
+  if (removable) {
     const bool pushed = cell.flags & kPressedTitle;
     const QRect b = tb.ToRect();
     p.fillRect(b, pushed ? head.darker(130) : head.lighter(135));
@@ -375,7 +414,7 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
     const QRect inner = b.adjusted(2, 2, -2, -2).translated(pushed ? 1 : 0, pushed ? 1 : 0);
     if (!pm.isNull()) p.drawPixmap(inner, pm);
     else PArrowButtonTypeEx::DrawInfoGlyph(p, inner, QColor(40, 110, 190));
-    const QString code = Q(hv::Widen(ins.displayCode.empty() ? ins.symbol : ins.displayCode)).trimmed();
+    const QString code = CodeText(ins);
     const QString exch = Q(hv::Widen(ins.exchangeCode)).trimmed();
     p.setFont(base);
     p.setPen(text);
@@ -398,21 +437,17 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
   const auto& pchg = quote[QuoteLayout::PChange];
   const int lastTop = second.bottom() + 2;
   const QRect lastRect(bodyR.left() + 6, lastTop, bodyR.width() - 12, 26);
-  if (last.mark == kMarkUp || last.mark == kMarkDown)
+  const bool flashing = last.mark == kMarkUp || last.mark == kMarkDown;
+  if (flashing)
     p.fillRect(QRect(lastRect.left() - 2, lastRect.top(), lastRect.width() / 2, lastRect.height()),
-               last.mark == kMarkUp ? QColor(214, 245, 214) : QColor(252, 218, 218));
+               last.mark == kMarkUp ? riseBack : fallBack);
   const QColor signColor = chg.value > 0 ? up : chg.value < 0 ? down : text;
   p.setFont(big);
-  p.setPen(signColor);
+  p.setPen(flashing ? flashText : signColor);
   p.drawText(lastRect.adjusted(0, 0, -lastRect.width() / 3, 0), Qt::AlignVCenter | Qt::AlignLeft, Q(last.text));
   {
-    QString change = Q(chg.text);
-    if (chg.value > 0 && !change.startsWith(QLatin1Char('+'))) change.prepend(QLatin1Char('+'));
-    QString pct = Q(pchg.text);
-    if (!pct.isEmpty()) {
-      if (pchg.value > 0 && !pct.startsWith(QLatin1Char('+'))) pct.prepend(QLatin1Char('+'));
-      pct += QLatin1Char('%');
-    }
+    const QString change = ChangeText(chg);
+    const QString pct = PercentText(pchg);
     const QString arrow = chg.value > 0 ? QStringLiteral("\u25B2 ") : chg.value < 0 ? QStringLiteral("\u25BC ") : QString();
     // Change over percentage at the right; the price keeps the rest.
     p.setFont(bold);
@@ -478,11 +513,11 @@ void PBoardTypeEx::DrawTile(QPainter& p, const QRect& rect, const CGridCell& cel
                QStringLiteral("Quantity"));
     const QRect field = AreaBox(rect, kQtyField).ToRect();
     const bool invalid = cell.flags & kFlagInvalidQuantity;
-    p.fillRect(field, QColor(255, 255, 255));
+    p.fillRect(field, editBack);
     p.setPen(invalid ? down : frame);
     p.drawRect(field.adjusted(0, 0, -1, -1));
     p.setFont(base);
-    p.setPen(invalid ? down : QColor(20, 20, 20));
+    p.setPen(invalid ? down : editText);
     p.drawText(field.adjusted(3, 0, -3, 0), Qt::AlignVCenter | Qt::AlignRight, cell.text);
     const QRect button = AreaBox(rect, kQtyListButton).ToRect();
     p.fillRect(button, Mix(body, head, 0.2));

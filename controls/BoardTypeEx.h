@@ -24,6 +24,7 @@
 #include <utility>
 
 #include "controls/CellTypes.h"
+#include "data/QuoteStore.h"
 #include "grid/GridCellType.h"
 
 class CSuperBaseView;
@@ -44,7 +45,15 @@ class PBoardTypeEx : public CGridDropListType, public CStyledCellType {
   static constexpr std::uint32_t kPressedTitle = 0x80000000u;
   // Set by the grid on a tile whose quantity failed validation.
   static constexpr std::uint32_t kFlagInvalidQuantity = 0x00010000u;
+  // Set by the grid on the tile the user picked (drawn as selected).
+  static constexpr std::uint32_t kFlagSelectedTile = 0x00020000u;
+  // Set by the grid on tiles of a list the user cannot edit: no remove button.
+  static constexpr std::uint32_t kFlagFixedTile = 0x00040000u;
   static constexpr std::int64_t kWritableBase = 1000000;
+  // Style colours of rise, fall and a fresh change (those of the quote table).
+  enum StyleColor : int {
+    kStyleRise = 3101, kStyleFall = 3102, kStyleChangedText = 3103, kStyleRiseBack = 3104, kStyleFallBack = 3106,
+  };
   static constexpr const wchar_t* kCompanyInfoPicture = L"images/QuickBar/[styleID]/CompanyInfo.bmp";
 
   explicit PBoardTypeEx(CGridCtrl* grid = nullptr);
@@ -69,6 +78,16 @@ class PBoardTypeEx : public CGridDropListType, public CStyledCellType {
   void SetQuantitySource(std::function<QStringList(int col, int row)> source) { m_quantities = std::move(source); }
   Area LastPressArea() const { return m_lastPress; }
   QString QuantityListText(int index);
+  // The market delay text of an exchange (asks 601 through the owner view
+  // once per key on a miss); what the tile's badge shows.
+  QString MarketDelay(std::int64_t productId, const std::string& exchange);
+  // Texts as a tile shows them. A volume: grouped, millions and billions
+  // shortened; a change with its sign; a percentage with sign and "%".
+  static QString VolumeText(const QuoteCell& cell);
+  static QString ChangeText(const QuoteCell& change);
+  static QString PercentText(const QuoteCell& percent);
+  static QString NameText(const JInstrumentUnderlying& instrument);
+  static QString CodeText(const JInstrumentUnderlying& instrument);
   // Caption texts 201 to 205 of section 13: "Bid", "Ask", "Vol", "Chg", "Delay".
   QString Caption(int id) const;
 
@@ -90,7 +109,8 @@ class PBoardTypeEx : public CGridDropListType, public CStyledCellType {
 
  private:
   void DrawTile(QPainter& p, const QRect& rect, const CGridCell& cell, bool selected);
-  QString MarketDelay(std::int64_t productId, const std::string& exchange);
+  // HitArea, with the remove button of a fixed tile taken as its title strip.
+  Area TileArea(int col, int row, const QRect& rect, const QPoint& pt) const;
   void ClearPress();
 
   CSuperBaseView* m_owner = nullptr;

@@ -169,6 +169,9 @@ class CellStore {
     return taken;
   }
   std::size_t PendingCount() const;
+  // Forgets every record and the pending list (tests; a store's version keeps
+  // growing, so a view never mistakes a new record for one it has seen).
+  void Clear();
 
   // Clears marks that are kMarkLifetimeMs old or older.
   void ExpireMarks(std::uint32_t now);
@@ -419,6 +422,17 @@ void CellStore<L>::ExpireMarks(std::uint32_t now) {
       marked_.pop_back();
     }
   }
+}
+
+template <class L>
+void CellStore<L>::Clear() {
+  std::lock_guard lock(mu_);
+  map_.clear();
+  records_.clear();
+  pending_.clear();
+  marked_.clear();
+  changed_.clear();
+  BumpVersion();
 }
 
 template <class L>

@@ -845,6 +845,7 @@ bool CGridCtrl::StartEdit(int col, int row, const QString& initial, bool useInit
   edit->setAlignment(Qt::Alignment(cell.alignment ? cell.alignment : int(Qt::AlignLeft | Qt::AlignVCenter)));
   edit->installEventFilter(this);
   m_editor = edit;
+  OnEditorCreated(col, row, edit);
   PositionEditor();
   edit->show();
   edit->setFocus();

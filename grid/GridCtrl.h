@@ -224,6 +224,8 @@ class CGridCtrl : public QAbstractScrollArea {
   virtual void OnSelectionChanged() {}
   // In-place editing: false refuses. `text` starts as the cell's text.
   virtual bool OnEditStart(int col, int row, QString& text) { return false; }
+  // The editor was made for the cell (a validator, a length limit...).
+  virtual void OnEditorCreated(int col, int row, QLineEdit* editor) {}
   // False keeps the editor open (not for cancel).
   virtual bool OnEditFinish(int col, int row, const QString& text, bool cancelled) { return true; }
   // A cell type reports `code` with `param`.

@@ -91,6 +91,9 @@ void MainWindow::BuildMenus(const std::vector<ViewClass>& addonClasses, const st
   file->addAction("&Settings...", this, &MainWindow::settingsRequested);
   file->addAction("Save &layout", this, &MainWindow::saveLayoutRequested);
   file->addSeparator();
+  file->addAction("&Export watchlists...", this, &MainWindow::exportWatchlistsRequested);
+  file->addAction("&Import watchlists...", this, &MainWindow::importWatchlistsRequested);
+  file->addSeparator();
   QAction* quit = file->addAction("&Quit", this, &QWidget::close);
   quit->setShortcut(QKeySequence::Quit);
 

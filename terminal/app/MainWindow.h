@@ -107,6 +107,8 @@ class MainWindow : public QMainWindow {
   void fontSizeRequested();
   void settingsRequested();
   void saveLayoutRequested();
+  void exportWatchlistsRequested();
+  void importWatchlistsRequested();
   void dropRequested(CSuperBaseView* target, const QString& sourceClass, const QString& link);
   void closingWindow();
 

@@ -103,6 +103,19 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
       OpenRequest r;
       if (!ParseOpen(text, r, error)) return false;
       o.open.push_back(std::move(r));
+    } else if (arg == "--param") {
+      std::string text;
+      if (!value(text)) return false;
+      const auto eq = text.find('=');
+      if (o.open.empty()) {
+        error = "--param " + text + ": comes after the --open of the view it is for";
+        return false;
+      }
+      if (eq == std::string::npos || eq == 0) {
+        error = "--param " + text + ": write KEY=VALUE";
+        return false;
+      }
+      o.open.back().params[text.substr(0, eq)] = text.substr(eq + 1);
     } else if (arg == "--style") {
       std::string text;
       if (!value(text)) return false;
@@ -183,6 +196,9 @@ Options:
                           CTradeSummaryAdv CPriceAlertList CNewPriceAlertAdv
                           CTradeView CBranticChartView CInsExpViewEx
                           CStockAnalytics CFNews
+  --param KEY=VALUE       a start parameter of the view of the --open before it
+                          (repeatable), as a saved layout gives it back, e.g.
+                          --open CPriceViewAdv --param User_field_display_mode=Board
   --no-restore            do not reopen the saved layout
   --headless              no window system (Qt offscreen) and a virtual clock
   --seconds N             run N simulated seconds as fast as possible, then save
@@ -198,10 +214,11 @@ Options:
                           headless run lasts as long as the recording)
   --speed X               replay speed, 0.1 to 1000 (default 1: as recorded)
   --snapshot DIR          at the end, write a PNG of the main window and of each view
-  --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv
-                          and the trade tape of each shown instrument as
-                          DIR/market-trades-<code>.tsv, and the volume by price
-                          of each trade summary's instrument as
+  --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv,
+                          the market's quotes of the shown instruments as
+                          DIR/market-quotes.tsv, the trade tape of each shown
+                          instrument as DIR/market-trades-<code>.tsv, and the
+                          volume by price of each trade summary's instrument as
                           DIR/market-summary-<code>.tsv
   --list-instruments [N]  print the first N simulated instruments (all without N):
                           product id, instrument code, exchange code, name;

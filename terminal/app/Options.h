@@ -1,6 +1,7 @@
 #pragma once
 // The terminal's command line.
 #include <cstdint>
+#include <map>
 #include <optional>
 #include <string>
 #include <vector>
@@ -12,6 +13,8 @@ struct OpenRequest {
   std::string className;
   std::int64_t productId = -1;
   std::string instrumentCode;  // empty: none
+  // Start parameters (--param KEY=VALUE after the --open), as a saved layout gives them.
+  std::map<std::string, std::string> params;
 };
 
 struct Options {

@@ -3,6 +3,8 @@
 #include <QApplication>
 #include <QDir>
 #include <QFile>
+#include <QFileDialog>
+#include <QMessageBox>
 #include <QInputDialog>
 #include <QPalette>
 #include <QPixmap>
@@ -21,6 +23,7 @@
 #include "terminal/app/GridDump.h"
 #include "terminal/app/MarketSummaryDump.h"
 #include "terminal/app/MarketDump.h"
+#include "terminal/host/MarketQuotes.h"
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/MarketFiles.h"
 #include "terminal/app/PlaybackBar.h"
@@ -181,6 +184,8 @@ bool TerminalApp::Start(std::string& error) {
   });
   connect(w, &MainWindow::fontSizeRequested, this, &TerminalApp::ShowFontSize);
   connect(w, &MainWindow::settingsRequested, this, &TerminalApp::ShowSettings);
+  connect(w, &MainWindow::exportWatchlistsRequested, this, &TerminalApp::ExportWatchlistsFromMenu);
+  connect(w, &MainWindow::importWatchlistsRequested, this, &TerminalApp::ImportWatchlistsFromMenu);
   connect(w, &MainWindow::saveLayoutRequested, this, [this] {
     if (SaveLayout()) m_window->ShowNotice("Layout saved.");
   });
@@ -204,9 +209,12 @@ bool TerminalApp::Start(std::string& error) {
       params["User_field_product_id"] = std::to_wstring(o.productId);
       params["User_field_save_space"] = L"0";
     }
+    for (const auto& [key, value] : o.params) params[key] = hv::Widen(value);
     CSuperBaseView* v = OpenView(o.className, known ? o.productId : -1, known ? o.instrumentCode : std::string(),
                                  params, {}, error);
     if (!v) return false;
+    // Start parameters reach the view as a restored layout's do.
+    if (!o.params.empty()) m_runtime->DeliverStartLink(v);
     if (known) DeliverLink(v, o.productId, o.instrumentCode);
     if (!unknownInstruments[k].empty()) ReportProblem(QString::fromStdString("The " + unknownInstruments[k]) +
                                                           ". The view opened without an instrument.", true);
@@ -400,6 +408,50 @@ void TerminalApp::ShowFontSize() {
   if (!any) m_window->ShowNotice("Open a price view to change its font size.");
 }
 
+bool TerminalApp::ExportWatchlists(const QString& path, QString* error) {
+  QFile f(path);
+  if (!f.open(QIODevice::WriteOnly | QIODevice::Truncate | QIODevice::Text) ||
+      f.write(QByteArray::fromStdString(m_runtime->ExportWatchlists())) < 0 || !f.flush()) {
+    if (error) *error = QString("Cannot write %1: %2").arg(path, f.errorString());
+    return false;
+  }
+  return true;
+}
+
+QStringList TerminalApp::ImportWatchlists(const QString& path) {
+  QFile f(path);
+  if (!f.open(QIODevice::ReadOnly | QIODevice::Text))
+    return {QString("Cannot read %1: %2").arg(path, f.errorString())};
+  QStringList problems;
+  for (const std::string& p : m_runtime->ImportWatchlists(f.readAll().toStdString()))
+    problems << QString::fromStdString(p);
+  return problems;
+}
+
+void TerminalApp::ExportWatchlistsFromMenu() {
+  const QString path =
+      QFileDialog::getSaveFileName(m_window.get(), "Export watchlists", "watchlists.txt", "Text files (*.txt)");
+  if (path.isEmpty()) return;
+  QString error;
+  if (ExportWatchlists(path, &error)) m_window->ShowNotice("Watchlists exported to " + path + ".");
+  else QMessageBox::warning(m_window.get(), "Export watchlists", error);
+}
+
+void TerminalApp::ImportWatchlistsFromMenu() {
+  const QString path = QFileDialog::getOpenFileName(m_window.get(), "Import watchlists", QString(),
+                                                    "Text files (*.txt);;All files (*)");
+  if (path.isEmpty()) return;
+  const QStringList problems = ImportWatchlists(path);
+  if (problems.isEmpty()) {
+    m_window->ShowNotice("Watchlists imported from " + path + ".");
+    return;
+  }
+  QMessageBox box(QMessageBox::Warning, "Import watchlists",
+                  "Nothing was imported: the file breaks the watchlist rules.", QMessageBox::Ok, m_window.get());
+  box.setDetailedText(problems.join('\n'));
+  box.exec();
+}
+
 void TerminalApp::ShowSettings() {
   SettingsDialog dialog(&m_runtime->Language(), m_window.get());
   if (dialog.exec() != QDialog::Accepted) return;
@@ -506,6 +558,11 @@ int TerminalApp::RunTimed() {
     if (!m_runtime->Replay()) {
       if (WriteMarketTradeDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
       if (WriteMarketSummaryDumps(*m_window, *m_runtime, m_options.dumpDir, error) < 0) { Progress("error: " + error); code = 1; }
+      const std::string quotes = (fs::path(m_options.dumpDir) / "market-quotes.tsv").string();
+      if (!WriteMarketQuotes(quotes, m_runtime->Market(), m_runtime->QuoteInstruments(), error)) {
+        Progress("error: " + error);
+        code = 1;
+      }
     }
   }
   if (!m_options.snapshotDir.empty()) {

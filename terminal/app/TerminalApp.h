@@ -66,6 +66,11 @@ class TerminalApp : public QObject, public IHostShell {
   CSuperBaseView* OpenView(const std::string& className, std::int64_t productId, const std::string& code,
                            const StartParamMap& params, const QString& objectName, std::string& error);
   bool SaveLayout();
+  // The user's watchlists to and from a text file (File menu). Export: false
+  // with `error` when the file cannot be written. Import: the problems (the
+  // file is refused as a whole), or an empty list when the lists were added.
+  bool ExportWatchlists(const QString& path, QString* error);
+  QStringList ImportWatchlists(const QString& path);
   // Restores the saved layout; returns the number of views reopened.
   int RestoreLayout();
 
@@ -89,6 +94,8 @@ class TerminalApp : public QObject, public IHostShell {
   void OnDrop(CSuperBaseView* target, const QString& source, const QString& link);
   void OpenFromMenu(const QString& className);
   void ShowSettings();
+  void ExportWatchlistsFromMenu();
+  void ImportWatchlistsFromMenu();
   void ShowFontSize();
   void ChangeStyle(int styleId);
   // The whole application (menus, docks, status bar, dialogs) in the style's colours.

@@ -1,4 +1,5 @@
 #include "terminal/host/HostRuntime.h"
+#include "terminal/host/WatchlistTransfer.h"
 
 #include <QDir>
 #include <QObject>
@@ -291,7 +292,27 @@ std::vector<StoredWatchlist> HostRuntime::Watchlists(StoredWatchlist::Kind kind)
   return kind == StoredWatchlist::Brand ? d->user->brandLists : d->user->userLists;
 }
 std::vector<PriceAlertItem> HostRuntime::Alerts() const { return d->user->alerts->All(); }
+
+std::string HostRuntime::ExportWatchlists() const { return WatchlistsText(d->user->userLists, *d->market); }
+
+std::vector<std::string> HostRuntime::ImportWatchlists(const std::string& text) {
+  WatchlistImport import = ReadWatchlistsText(text, d->user->userLists, *d->market, d->user->settings);
+  if (!import.Ok()) {
+    d->log->Warn("watchlist import refused: " + std::to_string(import.problems.size()) + " problem(s), first: " +
+                 import.problems.front());
+    return import.problems;
+  }
+  const std::size_t added = import.lists.size();
+  d->user->AddUserLists(std::move(import.lists));
+  d->log->Info("watchlist import: " + std::to_string(added) + " watchlist(s) added");
+  // The price views take the lists as a 610 reply; the leading one then tells the others (300).
+  const std::vector<JWatchlistRow> rows = d->user->UserRows();
+  d->views.Broadcast(d->views.Of(kPriceView), hm::WatchlistList, ToLParam(&rows));
+  return {};
+}
 HostStats HostRuntime::Stats() const { return d->stats; }
+
+std::vector<int> HostRuntime::QuoteInstruments() const { return d->subscriptions->QuoteInstruments(); }
 
 // Every request goes through the table (terminal/host/requests/).
 void HostRuntime::OnChildFeedback(CSuperBaseView* v, UINT msg, LPARAM data) {

@@ -191,8 +191,16 @@ class HostRuntime : public IViewHost {
   // Current user and brand watchlists and alerts, as stored.
   std::vector<StoredWatchlist> Watchlists(StoredWatchlist::Kind kind) const;
   std::vector<PriceAlertItem> Alerts() const;
+  // The user's watchlists as text (see WatchlistTransfer.h).
+  std::string ExportWatchlists() const;
+  // Adds the watchlists of `text` and has every price view show them; the
+  // problems when the text is refused (then nothing changes).
+  std::vector<std::string> ImportWatchlists(const std::string& text);
 
   HostStats Stats() const;
+  // The market indexes of the instruments some view holds a quote
+  // subscription for (kind 0, param 0), in subscription order.
+  std::vector<int> QuoteInstruments() const;
 
   // ---- IViewHost -----------------------------------------------------------------
   void OnChildFeedback(CSuperBaseView* view, UINT message, LPARAM data) override;

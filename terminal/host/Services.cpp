@@ -37,12 +37,12 @@ const Entry kSection13[] = {
     {119, L"Prev Close"}, {120, L"Currency"}, {121, L"L/S"}, {122, L"TAC"}, {123, L"CFD"}, {124, L""},
     {125, L"Delay"}, {126, L"DMA"}, {127, L"Month"}, {128, L"Year"},
     // Board tile captions.
-    {201, L"Bid"}, {202, L"Ask"}, {203, L"Last"}, {204, L"Volume"}, {205, L"Change"},
+    {201, L"Bid"}, {202, L"Ask"}, {203, L"Vol"}, {204, L"Chg"}, {205, L"Delay"},
     // Price grid menu and watchlists.
     {401, L"Buy"}, {402, L"Sell"}, {403, L"Add to Watchlist"}, {404, L"Remove from this Watchlist"},
     {407, L"Delete this watchlist?"}, {408, L"The watchlist name cannot be empty."},
     {409, L"already exists. Please choose another name."}, {410, L"Rename"}, {411, L"Delete"},
-    {412, L"Double-click to trade"}, {413, L"This watchlist is empty. Add instruments with the search box above."},
+    {412, L"Remove from this list"}, {413, L"This watchlist is empty. Add instruments with the search box above."},
     {414, L"Chart"}, {415, L"Stock Analytics"},
     {416, L"%s has no instruments at the moment."}, {417, L"This list is empty."},
     {418, L"Related News"}, {419, L"Double-click for the legend"},
@@ -118,8 +118,8 @@ MessageTexts::MessageTexts() {
   texts_ = {
       {"11007", L"The quantity cannot be zero."},
       {"11013", L"The quantity is above the maximum allowed for this instrument."},
-      {"11014", L"The quantity must be a multiple of the lot size."},
-      {"11015", L"The order value is above your trading limit."},
+      {"11014", L"The quantity is below the lot size."},
+      {"11015", L"The quantity is above your trading limit."},
       {"14009", L"%s are not available in this view."},
       {"17001", L"Market depth is not available for this exchange."},
       {"17002", L"Time and sales is not available for this exchange."},

@@ -1,6 +1,7 @@
 #include "terminal/host/SubscriptionBook.h"
 
 #include <algorithm>
+#include <set>
 
 #include "hostview/MessageIds.h"
 #include "terminal/host/HostRuntime.h"
@@ -253,6 +254,14 @@ void SubscriptionBook::Deliver(Answers& list, UINT msg) {
     if (msg == hm::FieldValue) ++stats_.pushes; else ++stats_.answers;
     v->OnHostMessage(msg, ToLParam(&u));
   }
+}
+
+std::vector<int> SubscriptionBook::QuoteInstruments() const {
+  std::vector<int> out;
+  std::set<int> seen;
+  for (const Sub& s : subs_)
+    if (s.alive && s.kind == 0 && s.param == 0 && seen.insert(s.instrument).second) out.push_back(s.instrument);
+  return out;
 }
 
 }  // namespace term

@@ -36,6 +36,9 @@ class SubscriptionBook {
   // Forgets everything of `view`.
   void Drop(CSuperBaseView* view);
   std::size_t Count() const { return index_.size(); }
+  // The market indexes of the instruments with a quote subscription (kind 0,
+  // param 0) of any view, each once, in subscription order.
+  std::vector<int> QuoteInstruments() const;
 
  private:
   struct Sub {

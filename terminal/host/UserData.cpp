@@ -392,4 +392,13 @@ UserData::Edit UserData::SaveBrandItems(const WatchlistFeedback& f, const Market
   return Edit::Saved;
 }
 
+void UserData::AddUserLists(std::vector<StoredWatchlist> lists) {
+  for (StoredWatchlist& w : lists) {
+    w.id = nextWatchlistId_++;
+    w.kind = StoredWatchlist::User;
+    userLists.push_back(std::move(w));
+  }
+  SaveLists(StoredWatchlist::User);
+}
+
 }  // namespace term

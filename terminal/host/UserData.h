@@ -42,6 +42,8 @@ class UserData {
   // Stores a view's own setting ("view." + key); not one the runtime reads.
   void SaveViewSetting(const std::string& key, const std::string& value);
   void SaveLists(StoredWatchlist::Kind kind);
+  // Appends user watchlists (imported ones) with new ids and stores them.
+  void AddUserLists(std::vector<StoredWatchlist> lists);
   void SaveAlerts();
 
   // 2813 and 522 rows.

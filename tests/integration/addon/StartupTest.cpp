@@ -24,11 +24,15 @@ std::vector<std::string> Summary(const std::vector<Feedback>& requests) {
 TEST(PrepareBasicData_FirstActivation, PriceViewAsksItsParametersThenEveryMissingStore) {
   mvtest::ScriptedHost host;
   host.AnswerSetting(hm::SystemParameter, "MAXWL", "250");
+  host.AnswerValue(hm::DisplayMode, 1);
   CSuperBaseView* view = host.Open("CPriceViewAdv");
   ASSERT_NE(view, nullptr);
+  // Then the size, the display mode for the family buttons, the title, the
+  // remark texts and the "MODSA" parameter.
   EXPECT_EQ(Summary(host.Requests()),
             (std::vector<std::string>{"515 ADVFT", "515 MAXWL", "515 MAXWT", "518 OLDWL", "518 WLNOT", "515 MKTEX",
-                                      "505", "503", "500", "610", "522", "521", "102 300x150", "101 title"}));
+                                      "505", "503", "500", "610", "522", "521", "102 300x150", "519", "101 title",
+                                      "504", "515 MODSA"}));
 
   // Second activation, and a second price view: nothing is asked again.
   host.ClearRequests();
@@ -36,7 +40,8 @@ TEST(PrepareBasicData_FirstActivation, PriceViewAsksItsParametersThenEveryMissin
   host.Send(view, hm::Activate);
   host.Open("CPriceViewAdv");
   EXPECT_EQ(Summary(host.Requests()),
-            (std::vector<std::string>{"102 300x150", "101 title", "102 300x150", "101 title"}));
+            (std::vector<std::string>{"102 300x150", "101 title", "504", "515 MODSA", "102 300x150", "101 title", "504",
+                                      "515 MODSA"}));
 }
 
 TEST(PrepareBasicData_FirstActivation, EachClassHasItsOwnFirstTimeFlag) {

@@ -70,12 +70,12 @@ struct ViewCase {
   bool onInstrument;
 };
 
-// One line per view that dumps a grid (the price view joins with
-// {"CPriceViewAdv", false} and the trade summary with {"CTradeSummaryAdv", true}
-// once they dump theirs).
+// One line per view that dumps a grid.
 const ViewCase kViews[] = {
     {"CMarketDepthAdv", true},
     {"CTimeAndSalesAdv", true},
+    {"CPriceViewAdv", false},
+    {"CTradeSummaryAdv", true},
 };
 
 QStringList OpenArgs(const std::vector<ViewCase>& views) {
@@ -85,12 +85,12 @@ QStringList OpenArgs(const std::vector<ViewCase>& views) {
   return args;
 }
 
-// Every view's dump file of a dump folder by name (not the simulator's trade
-// tapes, which a replay does not write).
+// Every view's dump file of a dump folder by name (not the simulator's
+// market-*.tsv files: tapes, summaries, quotes, which a replay does not write).
 std::map<QString, QByteArray> DumpFiles(const QString& dir) {
   std::map<QString, QByteArray> out;
   for (const QFileInfo& f : QDir(dir).entryInfoList(QDir::Files)) {
-    if (f.fileName().startsWith("market-trades-")) continue;
+    if (f.fileName().startsWith("market-")) continue;  // the simulator's files, not a view's
     QFile file(f.filePath());
     if (file.open(QIODevice::ReadOnly)) out[f.fileName()] = file.readAll();
   }

@@ -109,6 +109,14 @@ TEST(Options, CommandLineIsReadAsAUserWritesIt) {
   ASSERT_TRUE(ok);
   EXPECT_EQ(*o.listInstruments, 4);
 
+  // Start parameters belong to the --open before them; a value may hold '='.
+  o = Parse({"--open", "CPriceViewAdv", "--param", "User_field_display_mode=Board", "--open", "CTradeView",
+             "--param=Key=a=b"},
+            ok, error);
+  ASSERT_TRUE(ok) << error;
+  EXPECT_EQ(o.open[0].params, (std::map<std::string, std::string>{{"User_field_display_mode", "Board"}}));
+  EXPECT_EQ(o.open[1].params, (std::map<std::string, std::string>{{"Key", "a=b"}}));
+
   struct Bad {
     std::vector<std::string> args;
     const char* says;
@@ -121,6 +129,8 @@ TEST(Options, CommandLineIsReadAsAUserWritesIt) {
                                          {{"--open", "CTradeView:1"}, "CLASS:PRODUCTID:CODE"},
                                          {{"--open", "CTradeView:1:"}, "instrument code"},
                                          {{"--dump", "x"}, "--seconds"},
+                                         {{"--param", "A=B"}, "after the --open"},
+                                         {{"--open", "CTradeView", "--param", "AB"}, "KEY=VALUE"},
                                          {{"--frobnicate"}, "unknown option"}}) {
     Parse(bad.args, ok, error);
     EXPECT_FALSE(ok) << bad.args[0];
