@@ -60,6 +60,24 @@ bool IsBlank(std::wstring_view text) noexcept {
 }
 bool ParseNumber(std::string_view text, double& out) noexcept { return Parse(text, out); }
 
+bool IsNonFiniteText(std::wstring_view text) noexcept {
+  char buf[128];
+  std::size_t n = 0;
+  if (!ToAscii(text, buf, sizeof buf, n)) return false;
+  const char* p = buf;
+  const char* end = buf + n;
+  if (*p == '+' || *p == '-') ++p;
+  if (p == end) return false;
+  double v = 0.0;
+  const auto [ptr, ec] = std::from_chars(p, end, v);
+  if (ptr != end) return false;
+  if (ec == std::errc::result_out_of_range) {  // too large, unless it only underflows
+    const std::string_view digits(p, std::size_t(end - p));
+    return digits.find("e-") == std::string_view::npos && digits.find("E-") == std::string_view::npos;
+  }
+  return ec == std::errc{} && !std::isfinite(v);
+}
+
 std::wstring NumberFormat(int decimals) { return L"%." + std::to_wstring(decimals) + L"f"; }
 
 void FormatFixed(double value, int decimals, std::wstring& out) {

@@ -15,6 +15,10 @@ namespace mvd {
 bool ParseNumber(std::wstring_view text, double& out) noexcept;
 bool ParseNumber(std::string_view text, double& out) noexcept;
 
+// True for a text that reads as a number that is not finite ("nan", "-inf",
+// "Infinity", "1e999"): a view shows such a value as nothing.
+bool IsNonFiniteText(std::wstring_view text) noexcept;
+
 // True for a text of blanks only (or none): a withdrawn value.
 bool IsBlank(std::wstring_view text) noexcept;
 

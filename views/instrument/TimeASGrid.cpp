@@ -23,7 +23,7 @@ constexpr int kPageSlots = sales::kMaxHistoryPage + 1;
 // A volume as an integer with thousands separators; a text that is no number stays as it came.
 std::wstring VolumeText(const std::wstring& volume) {
   double v = 0;
-  if (!mvd::ParseNumber(volume, v)) return volume;
+  if (!mvd::ParseNumber(volume, v)) return mvd::IsNonFiniteText(volume) ? std::wstring() : volume;
   v = std::trunc(v);
   if (!(v >= -9.2e18 && v <= 9.2e18)) return volume;
   return hv::Widen(Integer2Str(static_cast<std::int64_t>(v)));
@@ -229,10 +229,11 @@ void TimeASGrid::OnGetCell(int col, int row, CGridCell& cell) {
   TradeTape::Instance().Read(m_key, rows - row, [&](const TradeRecord& t) {
     switch (col) {
       case kTime:
-        cell.SetText(t.time.size() > 8 ? t.time.substr(8) : t.time);
+        cell.SetText(mvd::IsNonFiniteText(t.time) ? std::wstring() : t.time.size() > 8 ? t.time.substr(8) : t.time);
         break;
       case kPrice:
-        cell.SetText(t.price);
+        // As received, but a non-finite number reads as no price.
+        cell.SetText(mvd::IsNonFiniteText(t.price) ? std::wstring() : t.price);
         break;
       case kVol:
         cell.SetText(VolumeText(t.volume));
@@ -267,7 +268,7 @@ void TimeASGrid::OnLClicked(int col, int row, bool pressed, const QRect&, const 
 
 void TimeASGrid::OpenTrade(int row) {
   const TradeRecord trade = TradeOfRow(row);
-  if (trade.number == 0 || trade.price.empty()) return;
+  if (trade.number == 0 || trade.price.empty() || mvd::IsNonFiniteText(trade.price)) return;
   // The side codes of a trade are "0" to "3"; only "A" and "B" name a side
   // for the ticket, so a click usually opens it without one.
   const char* side = trade.side == L"A" ? "Buy" : trade.side == L"B" ? "Sell" : "";

@@ -27,6 +27,14 @@ TEST(ParseNumber_NotFinite, RejectedAndOutputUntouched) {
   }
 }
 
+TEST(IsNonFiniteText_Kinds, OnlyNumbersThatAreNotFinite) {
+  for (const wchar_t* t : {L"nan", L"NaN", L"-nan", L" inf ", L"-inf", L"+Infinity", L"1e999", L"-1,0e400"})
+    EXPECT_TRUE(mvd::IsNonFiniteText(t)) << t;
+  // Prices as received that are no number, tiny numbers and plain numbers stay.
+  for (const wchar_t* t : {L"", L"-", L"MKT", L"1.5", L"-1", L"1e-400", L"info", L"nano", L"\xfffe"})
+    EXPECT_FALSE(mvd::IsNonFiniteText(t)) << t;
+}
+
 TEST(FormatFixed_Printf, MatchesPrintfOutput) {
   const double values[] = {0, 1, -1, 0.0005, 0.0015, 2.5, 3.5, 1234567.891, -0.0004, 1e15 + 0.5, 12.3456789};
   for (int dec : {0, 2, 3, 4, 10}) {
