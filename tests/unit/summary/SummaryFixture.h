@@ -14,6 +14,7 @@
 #include "data/MarketStores.h"
 #include "hostconfig/UserSettings.h"
 #include "hostview/HostLists.h"
+#include "mvtest/ProcessStateReset.h"
 #include "mvtest/ScriptedHost.h"
 #include "views/instrument/SummaryFeed.h"
 #include "views/instrument/TradeSGrid.h"
