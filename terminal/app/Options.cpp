@@ -136,6 +136,9 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
     } else if (arg == "--record") {
       if (!value(o.recordFile)) return false;
       if (o.recordFile.empty()) { error = "--record needs a file name"; return false; }
+    } else if (arg == "--trace-messages") {
+      if (!value(o.traceFile)) return false;
+      if (o.traceFile.empty()) { error = "--trace-messages needs a file name"; return false; }
     } else if (arg == "--replay") {
       if (!value(o.replayFile)) return false;
       if (o.replayFile.empty()) { error = "--replay needs a file name"; return false; }
@@ -212,6 +215,8 @@ Options:
                           every value, with its market time) to FILE, compressed
   --replay FILE           play a recording instead of the simulated market (a
                           headless run lasts as long as the recording)
+  --trace-messages FILE   write every message the views receive (number and record,
+                          as the fuzz harnesses read them) to FILE
   --speed X               replay speed, 0.1 to 1000 (default 1: as recorded)
   --snapshot DIR          at the end, write a PNG of the main window and of each view
   --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv,

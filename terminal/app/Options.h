@@ -35,6 +35,7 @@ struct Options {
   std::string addonPath;
   std::string dataDir;
   std::string recordFile;           // --record: write the market the views receive here
+  std::string traceFile;            // --trace-messages: every message a view receives, written here
   std::string replayFile;           // --replay: the market is this recording
   std::optional<double> speed;      // --speed: replay speed (needs --replay)
 };

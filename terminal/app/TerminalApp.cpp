@@ -138,6 +138,7 @@ bool TerminalApp::Start(std::string& error) {
   m_recordFile = m_options.recordFile;
   m_replaySeconds = ReplaySeconds(ho);
   m_runtime = std::make_unique<HostRuntime>(ho, this, m_hostStore.get());
+  if (!m_options.traceFile.empty() && !m_runtime->TraceMessages(m_options.traceFile, error)) return false;
   views::SetRuntime(m_runtime.get());
   m_log = m_runtime->LogFactory().CreateLogger();
   m_blotter = std::make_unique<views::Blotter>(m_store, m_runtime->Market().DateText());
@@ -293,7 +294,7 @@ void TerminalApp::DeliverLink(CSuperBaseView* view, std::int64_t productId, cons
   ViewLink vl;
   vl.className = hv::Widen(m_runtime->ClassNameOf(view));
   vl.link = &link;
-  view->OnHostMessage(hm::LinkData, ToLParam(&vl));
+  m_runtime->Deliver(view, hm::LinkData, ToLParam(&vl));
 }
 
 void TerminalApp::LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from) {

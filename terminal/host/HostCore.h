@@ -2,6 +2,7 @@
 // The host runtime's parts, shared by HostRuntime.cpp and the request handlers
 // in terminal/host/requests/ (see RequestTable.h for adding one). Internal to
 // the terminal's host side: the application and the tests use HostRuntime.h.
+#include <fstream>
 #include <memory>
 #include <string>
 
@@ -48,6 +49,7 @@ struct HostCore {
   MessageTexts messages;
 
   ViewDirectory views;
+  std::unique_ptr<std::ofstream> trace;  // --trace-messages
   std::unique_ptr<UserData> user;
   std::unique_ptr<SubscriptionBook> subscriptions;
   RequestTable requests;

@@ -123,6 +123,8 @@ HostRuntime::HostRuntime(const HostOptions& options, IHostShell* shell, IHostSto
 }
 
 HostRuntime::~HostRuntime() {
+  d->views.TraceTo(nullptr);
+  d->trace.reset();
   FinishRecording();
   d->views.DisconnectAll();
   d->log->Flush();
@@ -195,6 +197,21 @@ void HostRuntime::DeliverStartLink(CSuperBaseView* view) {
   link.className = hv::Widen(ClassNameOf(view));
   link.link = &text;
   d->views.Deliver(view, hm::LinkData, ToLParam(&link));
+}
+
+std::uint32_t HostRuntime::Deliver(CSuperBaseView* view, UINT message, LPARAM data) {
+  return d->views.Deliver(view, message, data);
+}
+
+bool HostRuntime::TraceMessages(const std::string& path, std::string& error) {
+  auto out = std::make_unique<std::ofstream>(path, std::ios::binary | std::ios::trunc);
+  if (!*out) {
+    error = "--trace-messages: cannot write " + path;
+    return false;
+  }
+  d->views.TraceTo(out.get());
+  d->trace = std::move(out);
+  return true;
 }
 
 std::vector<CSuperBaseView*> HostRuntime::Views() const { return d->views.Of(nullptr); }

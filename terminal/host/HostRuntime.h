@@ -145,6 +145,11 @@ class HostRuntime : public IViewHost {
   void Deactivate(CSuperBaseView* view);
   // 310 with the view's start parameters as a JSON link text (restored layouts).
   void DeliverStartLink(CSuperBaseView* view);
+  // OnHostMessage of a hosted view (0 for a view the runtime does not host).
+  std::uint32_t Deliver(CSuperBaseView* view, UINT message, LPARAM data);
+  // Writes every later message to a view into `path` (see ViewDirectory::TraceTo);
+  // false with `error` when the file cannot be written.
+  bool TraceMessages(const std::string& path, std::string& error);
   std::vector<CSuperBaseView*> Views() const;
   std::string ClassNameOf(const CSuperBaseView* view) const;
 

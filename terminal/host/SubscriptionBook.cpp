@@ -252,7 +252,7 @@ void SubscriptionBook::Deliver(Answers& list, UINT msg) {
   for (auto& [v, u] : list) {
     if (!views_.Live(v)) continue;
     if (msg == hm::FieldValue) ++stats_.pushes; else ++stats_.answers;
-    v->OnHostMessage(msg, ToLParam(&u));
+    views_.Deliver(v, msg, ToLParam(&u));
   }
 }
 

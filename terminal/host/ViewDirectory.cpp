@@ -2,7 +2,20 @@
 
 #include <QObject>
 
+#include "hostview/MessageTrace.h"
+
 namespace term {
+namespace {
+
+void AppendLength(std::string& out, std::size_t n) {
+  while (n >= 0x80) {
+    out.push_back(static_cast<char>((n & 0x7f) | 0x80));
+    n >>= 7;
+  }
+  out.push_back(static_cast<char>(n));
+}
+
+}  // namespace
 
 void ViewDirectory::Add(CSuperBaseView* view, std::string className, std::function<void()> onDestroyed) {
   Entry e;
@@ -53,7 +66,19 @@ std::vector<CSuperBaseView*> ViewDirectory::Of(const char* cls) const {
 }
 
 std::uint32_t ViewDirectory::Deliver(CSuperBaseView* view, UINT message, LPARAM data) {
-  if (!view || !Live(view)) return 0;
+  if (!view) return 0;
+  const Entry* e = Find(view);
+  if (!e) return 0;
+  if (trace_) {
+    std::string frame;
+    AppendLength(frame, e->className.size());
+    frame += e->className;
+    std::string bytes;
+    hv::trace::Encode(message, data, bytes);
+    AppendLength(frame, bytes.size());
+    frame += bytes;
+    trace_->write(frame.data(), static_cast<std::streamsize>(frame.size()));
+  }
   return view->OnHostMessage(message, data);
 }
 

@@ -7,6 +7,7 @@
 #include <QPointer>
 #include <cstdint>
 #include <functional>
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -51,9 +52,14 @@ class ViewDirectory {
   std::uint32_t Deliver(CSuperBaseView* view, UINT message, LPARAM data);
   void Broadcast(const std::vector<CSuperBaseView*>& targets, UINT message, LPARAM data,
                  CSuperBaseView* except = nullptr);
+  // Every later delivery is also written to `out` (null: none): per message the
+  // view's class name and the message as hv::trace encodes it, each a length
+  // (LEB128) and its bytes.
+  void TraceTo(std::ostream* out) { trace_ = out; }
 
  private:
   std::vector<Entry> entries_;
+  std::ostream* trace_ = nullptr;
 };
 
 }  // namespace term
