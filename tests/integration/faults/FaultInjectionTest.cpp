@@ -2,7 +2,10 @@
 // library as the terminal does, gets every host message it handles with a null
 // word, empty and large lists (20,000 records), 1 MB texts, invalid UTF-8 and
 // NaN/inf/negative numbers in field texts. No synchronous request is answered.
-// A view must neither crash nor hang, and no grid cell may show "nan" or "inf".
+// A view must neither crash nor hang, and no grid cell may show "nan" or "inf";
+// a message box it shows carries its caption, the exclamation icon and a text.
+// The price view shows an instrument in each watchlist family first, and gets
+// its own numbers too (300, 414, 611, and 413, 553, 606, 622 which it leaves alone).
 #include <gtest/gtest.h>
 
 #include <QMetaMethod>
@@ -123,6 +126,48 @@ void AddListFaults(std::vector<Fault>& out, UINT message, const std::function<Ro
   out.push_back(With(id + " short list again", message, one));
 }
 
+// The price view's field relay (414): the leading price view writes it into
+// the quote store, and "INSTRNAME" into the instrument record.
+constexpr UINT kRelayedField = 414;
+
+// The price view's own numbers: the watchlist reload (300 with a family), the
+// relayed field (414), the acknowledged ids (611), and the numbers it only
+// sends (413, 553) or leaves to the terminal (606, 622), which must change
+// nothing whatever their word points at.
+void AddPriceViewFaults(std::vector<Fault>& f) {
+  // BN4 on screen again (the list faults above replaced every watchlist).
+  f.push_back({"watchlists again", [](mvtest::ScriptedHost& h, CSuperBaseView* v) {
+                 const std::vector<JWatchlistRow> user{{1, 5, "Faults", "BN4", 1, 0}};
+                 h.Send(v, hm::WatchlistList, ToLParam(&user));
+                 h.Send(v, hm::WatchlistsLoaded, 0);
+                 h.Advance(1200);
+               }});
+  AddListFaults<JWatchlistIdRow>(f, hm::SaveWatchlistNames, [](std::size_t i, const std::string& t) {
+    return JWatchlistIdRow{static_cast<std::int32_t>(i) - 1, i % 2 ? std::string("Faults") : t};
+  });
+  // Numbers for the number fields; texts for the instrument name and remarks
+  // (a name that reads "nan" is a name, not a number).
+  const std::vector<std::string> badTexts = {"", " ", kBadUtf8, kMegabyte};
+  for (const std::string& name : {std::string("LAST"), std::string("BID"), std::string("PCHANGE"), std::string("VOL"),
+                                  std::string("INSTRNAME"), std::string("REMARKS"), kBadUtf8}) {
+    const bool text = name == "INSTRNAME" || name == "REMARKS";
+    for (const std::string& value : text ? badTexts : kBadNumbers)
+      f.push_back(With("414 " + name.substr(0, 10), kRelayedField, FieldUpdate{5, "BN4", name, value, 0, 0}));
+  }
+  f.push_back(With("414 unknown instrument", kRelayedField, FieldUpdate{-5, kMegabyte, "INSTRNAME", kBadUtf8, 0, 0}));
+  f.push_back(With("414 other kind", kRelayedField, FieldUpdate{5, "BN4", "LAST", "nan", 7, -1}));
+  for (UINT m : {hm::PriceViewRequest413, hm::PriceViewRequest553, hm::Watchlist606, hm::Watchlist622}) {
+    const std::string id = std::to_string(m);
+    f.push_back(With(id + " split value", m, JSplitValue{-1, std::numeric_limits<std::int32_t>::min()}));
+    f.push_back(With(id + " empty list", m, std::vector<JWatchlistRow>{}));
+    f.push_back(With(id + " large list", m, std::vector<JWatchlistRow>(kLarge, JWatchlistRow{1, 5, "Faults", "BN4", 1, 0})));
+    f.push_back(With(id + " 1MB text", m, kMegabyteW));
+    f.push_back(With(id + " invalid UTF-8", m, kBadUtf8));
+    f.push_back(With(id + " non-finite", m, JPriceInformation{kNaN, kInf, -kInf, -1.0}));
+    f.push_back(With(id + " save record", m, WatchlistFeedback{-1, kMegabyteW}));
+  }
+}
+
 // Every host -> view message number of the channel with its word shapes.
 std::vector<Fault> ChannelFaults() {
   std::vector<Fault> f;
@@ -133,10 +178,14 @@ std::vector<Fault> ChannelFaults() {
                  hm::WatchlistGroups521, hm::WatchlistRows522, hm::LinkModeFlag, hm::CompactLayout,
                  hm::FindByChartCode, hm::FindByCode, hm::MarketInfo, hm::ExchangeEnabled, hm::WatchlistList,
                  hm::LinkedInstrument, hm::FontSizeMenu, hm::Alert701, hm::Alert702, hm::Alert703, hm::Alert704,
-                 hm::Alert705, hm::PriceBands, hm::AltStatus, hm::SettingsChanged, hm::Sectors, hm::MessageText})
+                 hm::Alert705, hm::PriceBands, hm::AltStatus, hm::SettingsChanged, hm::Sectors, hm::MessageText,
+                 hm::WatchlistsLoaded, kRelayedField, hm::SaveWatchlistNames, hm::PriceViewRequest413,
+                 hm::PriceViewRequest553, hm::Watchlist606, hm::Watchlist622})
     f.push_back({"null " + std::to_string(m), [m](mvtest::ScriptedHost& h, CSuperBaseView* v) { h.Send(v, m, 0); }});
   // Numbers in the word: out of range, negative, huge.
-  for (UINT m : {hm::DisplayMode, hm::LinkModeFlag, hm::CompactLayout, hm::ExchangeEnabled, hm::AltStatus})
+  for (UINT m : {hm::DisplayMode, hm::LinkModeFlag, hm::CompactLayout, hm::ExchangeEnabled, hm::AltStatus,
+                 hm::WatchlistsLoaded, hm::PriceViewRequest413, hm::PriceViewRequest553, hm::Watchlist606,
+                 hm::Watchlist622})
     for (LPARAM value : {LPARAM(-1), LPARAM(2), LPARAM(999999), std::numeric_limits<LPARAM>::min(),
                          std::numeric_limits<LPARAM>::max()})
       f.push_back({std::to_string(m) + " word " + std::to_string(value),
@@ -241,6 +290,7 @@ std::vector<Fault> ChannelFaults() {
   }
   for (UINT m : {hm::FontSizeMenu, hm::SettingsChanged, hm::Deactivate, hm::Activate})
     f.push_back({std::to_string(m), [m](mvtest::ScriptedHost& h, CSuperBaseView* v) { h.Send(v, m, 0); }});
+  AddPriceViewFaults(f);
   return f;
 }
 
@@ -308,6 +358,35 @@ class FaultInjection : public testing::TestWithParam<ViewCase> {
     host.Send(view, hm::InstrumentList, ToLParam(&instrumentList));
     host.SendLink(view, L"{\"type\":\"x\",\"data\":[{\"Field_instrument_code\":\"BN4\",\"Field_product_id\":\"5\"}]}");
     host.Advance(600);
+    if (std::string(GetParam().className) == "CPriceViewAdv") SetUpWatchlists();
+  }
+
+  // The price view shows BN4 in a user, a TOP30 and a brand watchlist (the
+  // terminal relays the view's 300 back), so the faults reach its cells.
+  void SetUpWatchlists() {
+    const std::vector<JWatchlistRow> user{{1, 5, "Faults", "BN4", 1, 0}};
+    host.Send(view, hm::WatchlistList, ToLParam(&user));
+    host.Send(view, hm::WatchlistsLoaded, 0);
+    const std::vector<JTop30Group> top30{{"SGX", {{"TOPGAIN", {{5, "BN4", "SGX"}}}}}};
+    host.Send(view, hm::WatchlistGroups521, ToLParam(&top30));
+    host.Send(view, hm::WatchlistsLoaded, 1);
+    const std::vector<JKeldoWatchlistRow> brand{{7, "Brand", 5, "BN4", "SGX", 1}};
+    host.Send(view, hm::WatchlistRows522, ToLParam(&brand));
+    host.Send(view, hm::WatchlistsLoaded, 2);
+    host.Advance(1200);
+  }
+
+  // A message box the view showed must carry the view's caption, the
+  // exclamation icon and a text: the design's, or the lookup key of a
+  // message code the terminal did not answer.
+  void CheckRefusals(const std::string& after) {
+    for (const auto& shown : host.dialogs.shown) {
+      if (shown.kind != platform::RecordingDialogService::Shown::Box) continue;
+      EXPECT_EQ(shown.caption.toStdWString(), host.appTitle) << after;
+      EXPECT_EQ(shown.icon, platform::Icon::Exclamation) << after;
+      EXPECT_FALSE(shown.text.trimmed().isEmpty()) << after;
+    }
+    host.dialogs.shown.clear();
   }
 
   void CheckGrids(const std::string& after) {
@@ -333,6 +412,13 @@ TEST_P(FaultInjection, BadFieldValuesNeverShowAsNonFiniteNumbers) {
   FeedBadFieldValues(host, view);
   host.Advance(600);
   CheckGrids("bad field values");
+  CheckRefusals("bad field values");
+  if (std::string(GetParam().className) == "CPriceViewAdv") {
+    // The watchlist is on screen: the faults above reached its cells.
+    bool shown = false;
+    for (const QString& dump : GridDumps(view)) shown |= dump.contains(QStringLiteral("\tBN4\t"));
+    EXPECT_TRUE(shown);
+  }
   // Again after the view re-asks (pages, refresh): the new requests get the same treatment.
   host.Advance(5000);
   FeedBadFieldValues(host, view);
@@ -348,6 +434,7 @@ TEST_P(FaultInjection, EveryMessageWithBadDataLeavesAWorkingView) {
     fault.deliver(host, view);
     host.Advance(300);
     CheckGrids(fault.name);
+    CheckRefusals(fault.name);
     if (HasFatalFailure()) return;
   }
   // Still alive and still answering: the real list again, re-link and feed.
@@ -358,6 +445,17 @@ TEST_P(FaultInjection, EveryMessageWithBadDataLeavesAWorkingView) {
   FeedBadFieldValues(host, view);
   host.Advance(600);
   CheckGrids("the end");
+  // A refused trade ticket after all that, with the message text unanswered:
+  // the box shows the lookup key, as for any code without a text.
+  const std::string cls = GetParam().className;
+  if (cls != "CNewPriceAlertAdv" && cls != "CPriceAlertList") {
+    host.dialogs.shown.clear();
+    const std::wstring ticket = L"{\"type\":\"x\",\"data\":[{\"Field_instrument_code\":\"BN4\",\"Field_product_id\":\"5\"}]}";
+    platform::SendMessage(view, platform::RegisterWindowMessage("MSG_WLOPENTRADE"), WPARAM(ToLParam(&ticket)), -1);
+    ASSERT_EQ(host.dialogs.shown.size(), 1u);
+    EXPECT_EQ(host.dialogs.shown[0].text.toStdString(), "17007, 0");
+    CheckRefusals("a refused trade ticket");
+  }
   host.Destroy(view);
 }
 
