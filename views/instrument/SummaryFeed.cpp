@@ -53,6 +53,9 @@ std::vector<PageItem> ParsePage(std::wstring_view text, int page) {
     PageItem item;
     const bool totals = f[0].empty() || f[0] == L"TOTALS:";
     item.line = totals ? kTotalsLine : (page - 1) * kLinesPerPage + 1 + int(i);
+    // A page longer than its 40 lines reaches past the last line shown, and
+    // far enough even onto the totals' number: no such line exists.
+    if (!totals && item.line > kMaxLines) continue;
     if (!totals) item.price.assign(f[0]);
     item.trades.assign(f[1]);
     item.volume.assign(f[2]);

@@ -80,7 +80,8 @@ struct PageItem {
   std::wstring price, trades, volume, bid, ask;
 };
 // The items of page `page`'s text; items with fewer than six fields are left
-// out (they still count for the line numbers of the items after them).
+// out (they still count for the line numbers of the items after them), and so
+// is every item after the last line (999) but the totals.
 std::vector<PageItem> ParsePage(std::wstring_view text, int page);
 
 // What an update changed.

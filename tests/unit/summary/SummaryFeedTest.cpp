@@ -82,6 +82,27 @@ TEST_F(SummaryFeedTest, Apply_LinesAndTotalsIntoTheStoreHeaderFieldsApart) {
   EXPECT_EQ(SummaryHeaderStore::Instance().PendingCount(), 0u);
 }
 
+TEST_F(SummaryFeedTest, Apply_AnOversizedPageKeepsNoLineBeyondTheLast) {
+  // 200,000 items on page 99, whose first line (3921) is past the last one shown (999);
+  // before, each became a line record, and item 96,079 wrote into the totals (line 99999).
+  std::vector<std::string> items(200000, Item("1.5", 1, 1, 1, 0));
+  const std::size_t before = SummaryLineStore::Instance().Size();
+  EXPECT_EQ(Apply("TRADEDATA", Join(items), 99), summary::Applied::Nothing);
+  EXPECT_EQ(SummaryLineStore::Instance().Size(), before);
+  // Item 96,079 of page 99 would be line 99999, the totals' number: not the totals.
+  SummaryLineRecord none;
+  EXPECT_FALSE(summary::ReadLine(key, summary::kTotalsLine, none));
+  // 2,000 items and the totals on page 1: lines 1..999, the totals, nothing past them.
+  items.resize(2000);
+  items.push_back("TOTALS:|9|9|9||9");
+  EXPECT_EQ(Apply("TRADEDATA", Join(items), 1), summary::Applied::Lines);
+  EXPECT_EQ(SummaryLineStore::Instance().Size(), before + summary::kMaxLines + 1);
+  EXPECT_EQ(Line(summary::kTotalsLine)[SummaryLineLayout::Tradable].value, 9.0);
+  SummaryLineRecord beyond;
+  EXPECT_TRUE(summary::ReadLine(key, summary::kMaxLines, beyond));
+  EXPECT_FALSE(summary::ReadLine(key, summary::kMaxLines + 1, beyond));
+}
+
 TEST_F(SummaryFeedTest, Apply_UnchangedLinesKeepTheirMarksChangedOnesAreMarked) {
   Apply("TRADEDATA", Join({Item("10.5", 2, 200, 100, 100), Item("10.4", 1, 50, 0, 50)}));
   host.clock.Advance(100);
