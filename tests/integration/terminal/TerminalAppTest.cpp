@@ -109,6 +109,13 @@ TEST(Options, CommandLineIsReadAsAUserWritesIt) {
   ASSERT_TRUE(ok);
   EXPECT_EQ(*o.listInstruments, 4);
 
+  o = Parse({"--trace-messages", "t.bin"}, ok, error);
+  ASSERT_TRUE(ok) << error;
+  EXPECT_EQ(o.traceFile, "t.bin");
+  Parse({"--trace-messages="}, ok, error);
+  EXPECT_FALSE(ok);
+  EXPECT_EQ(error, "--trace-messages needs a file name");
+
   // Start parameters belong to the --open before them; a value may hold '='.
   o = Parse({"--open", "CPriceViewAdv", "--param", "User_field_display_mode=Board", "--open", "CTradeView",
              "--param=Key=a=b"},

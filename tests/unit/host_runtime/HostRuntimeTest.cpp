@@ -1,8 +1,12 @@
 #include <gtest/gtest.h>
 
+#include <cstdio>
+#include <fstream>
+#include <iterator>
 #include <map>
 
 #include "RecordingView.h"
+#include "hostview/MessageTrace.h"
 #include "TapeParsing.h"
 
 namespace {
@@ -339,4 +343,44 @@ TEST(HostRuntime, SameSeedAndClockGiveTheSamePushes) {
   const std::string a = run(9);
   EXPECT_EQ(a, run(9));
   EXPECT_NE(a, run(10));
+}
+
+TEST(HostRuntime, TracedMessagesAreWhatTheViewsReceivedWithTheirClass) {
+  Harness h;
+  const std::string path = QDir::tempPath().toStdString() + "/host-runtime-trace-" +
+                           std::to_string(QCoreApplication::applicationPid()) + ".bin";
+  std::string error;
+  ASSERT_FALSE(h.runtime->TraceMessages("/nonexistent-folder/trace.bin", error));
+  EXPECT_NE(error.find("/nonexistent-folder/trace.bin"), std::string::npos);
+  ASSERT_TRUE(h.runtime->TraceMessages(path, error)) << error;
+  RecordingView& v = h.View("CMarketDepthAdv");
+  const auto& ins = h.Ins(h.Busy());
+  v.Subscribe(ins.productId, ins.instrumentCode, {"BUY"});
+  h.Pump(1000);
+  const std::size_t received = v.notes.size();
+  ASSERT_GT(received, 0u);
+  h.runtime.reset();  // closes the trace
+
+  std::ifstream in(path, std::ios::binary);
+  const std::string bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+  std::remove(path.c_str());
+  // Frames: class name and message, each with its length.
+  hv::trace::Reader frames(bytes);
+  std::size_t k = 0;
+  while (!frames.AtEnd()) {
+    EXPECT_EQ(frames.Narrow(), "CMarketDepthAdv");
+    const std::string message = frames.Narrow();
+    hv::trace::Reader one(message);
+    hv::trace::Message m;
+    ASSERT_TRUE(hv::trace::Decode(one, m));
+    ASSERT_LT(k, received);
+    EXPECT_EQ(m.number, v.notes[k].msg) << k;
+    if (m.number == hm::RequestField || m.number == hm::FieldValue) {
+      const auto& u = *FromLParam<const FieldUpdate>(m.word);
+      EXPECT_EQ(u.fieldName, v.notes[k].update.fieldName);
+      EXPECT_EQ(u.value, v.notes[k].update.value);
+    }
+    ++k;
+  }
+  EXPECT_EQ(k, received);
 }
