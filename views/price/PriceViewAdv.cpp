@@ -74,7 +74,7 @@ std::wstring Lang(int id, const wchar_t* fallback) {
 }
 
 // A field update of the leading price view's instrument records.
-constexpr UINT kInstrumentFieldUpdate = 414;
+constexpr UINT kInstrumentFieldUpdate = hm::InstrumentFieldUpdate;
 
 // Process-wide: how often a silent instrument was asked again.
 std::map<InstrumentKey, int>& RetryCounters() {
