@@ -1,5 +1,6 @@
 #include "views/price/PriceGrid.h"
 
+#include <QMimeData>
 #include <QPaintEvent>
 #include <QHash>
 #include <QPainter>
@@ -11,8 +12,10 @@
 #include "addon/LinkText.h"
 #include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
+#include "addon/ViewClasses.h"
 #include "data/MarketDelayCache.h"
 #include "data/ReferenceStores.h"
+#include "hostview/DragData.h"
 #include "hostview/HostLists.h"
 #include "hostview/MessageIds.h"
 #include "hostview/NumberText.h"
@@ -250,6 +253,7 @@ PriceGrid::PriceGrid(QWidget* parent)
   SetHighlightSelection(false);
   EnableColumnMove(true);
   EnableRowMove(false);
+  EnableDragOut(true);
   m_palette.evenRow = ColorFromRef(kDefaultEvenRow);
   m_palette.oddRow = ColorFromRef(kDefaultOddRow);
   m_palette.selBack = ColorFromRef(kDefaultSelRow);
@@ -1076,4 +1080,29 @@ void PriceGrid::OnRowsMoved(const std::vector<int>& rows, int to) {
   m_sortFlag = 0;
   SendToOwner(addon::Msg().wlMoveIns, 0, 0);
   RedrawAll();
+}
+
+// ---- Dragging rows out ----------------------------------------------------------------------------
+
+bool PriceGrid::OnDragOutData(const std::vector<int>& rows, QMimeData& mime) {
+  // World indices open nothing elsewhere (no link, no view commands): they stay.
+  if (m_listKind == kWorldIndices) return false;
+  std::vector<InstrumentKey> keys;
+  addon::LinkTextBuilder link{std::string_view(addon::kPriceViewSource)};
+  for (int r : rows) {
+    if (r < 0 || r >= int(m_rows.size())) continue;
+    const Row& row = m_rows[std::size_t(r)];
+    if (!keys.empty()) link.NextObject();
+    link.AddInt64(addon::linkkey::kProductId, row.key.ProductID)
+        .Add(addon::linkkey::kInstrumentCode, std::wstring_view(row.key.InstrumentCode))
+        .Add(addon::linkkey::kExchangeCode, std::string_view(row.exchangeCode));
+    keys.push_back(row.key);
+  }
+  if (keys.empty()) return false;
+  if (!platform::SendMessage(Owner(), addon::Msg().wlStartDrag, ToLParam(&keys), 0)) return false;
+  const QByteArray text = QByteArray::fromStdString(link.Narrow());
+  mime.setData(hv::drag::kLinkMimeType, text);
+  mime.setData(hv::drag::kSourceMimeType, QByteArray(addon::kPriceViewSource));
+  mime.setText(QString::fromUtf8(text));
+  return true;
 }
