@@ -1070,7 +1070,16 @@ bool PriceGrid::OnCanMoveRows(const std::vector<int>&, int) {
   return m_listKind == kUserWatchlists || m_listKind == kKeldoWatchlists;
 }
 
-void PriceGrid::OnRowsMoved(const std::vector<int>& rows, int to) {
+void PriceGrid::OnRowsMoved(const std::vector<int>& movedRows, int to) {
+  std::vector<int> rows = movedRows;
+  if (!m_dragKeys.empty()) {
+    // Dropped back: the dragged instruments where they are now (the sort may have run meanwhile).
+    rows.clear();
+    for (int r = 0; r < int(m_rows.size()); ++r)
+      if (std::find(m_dragKeys.begin(), m_dragKeys.end(), m_rows[std::size_t(r)].key) != m_dragKeys.end())
+        rows.push_back(r);
+    if (rows.empty()) return;
+  }
   std::vector<std::size_t> order(m_rows.size());
   std::iota(order.begin(), order.end(), std::size_t(0));
   CGridCtrl::ApplyRowMove(order, rows, to);
@@ -1100,9 +1109,12 @@ bool PriceGrid::OnDragOutData(const std::vector<int>& rows, QMimeData& mime) {
   }
   if (keys.empty()) return false;
   if (!platform::SendMessage(Owner(), addon::Msg().wlStartDrag, ToLParam(&keys), 0)) return false;
+  m_dragKeys = keys;
   const QByteArray text = QByteArray::fromStdString(link.Narrow());
   mime.setData(hv::drag::kLinkMimeType, text);
   mime.setData(hv::drag::kSourceMimeType, QByteArray(addon::kPriceViewSource));
   mime.setText(QString::fromUtf8(text));
   return true;
 }
+
+void PriceGrid::OnDragOutDone(Qt::DropAction) { m_dragKeys.clear(); }

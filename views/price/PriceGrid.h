@@ -173,6 +173,7 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   bool OnCanMoveRows(const std::vector<int>& rows, int to) override;
   void OnRowsMoved(const std::vector<int>& rows, int to) override;
   bool OnDragOutData(const std::vector<int>& rows, QMimeData& mime) override;
+  void OnDragOutDone(Qt::DropAction action) override;
   bool OnKeyDown(int key, Qt::KeyboardModifiers mods) override;
   void paintEvent(QPaintEvent* e) override;
 
@@ -218,6 +219,8 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   std::uint64_t m_updates = 0;
   std::vector<Column> m_columns;
   int m_sortCol = -1;
+  // The instruments of the drag that runs: a re-sort while it runs moves their rows.
+  std::vector<InstrumentKey> m_dragKeys;
   int m_sortFlag = 0;
   int m_pressedHeading = -2;
   bool m_columnMoved = false;

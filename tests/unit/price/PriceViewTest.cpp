@@ -618,11 +618,13 @@ struct GridDrag {
   PriceGrid* grid;
   bool dropBack = false;
   bool taken = false;
+  std::function<void()> meanwhile;  // runs while the drag is on
   std::vector<std::string> links, sources;
   explicit GridDrag(PriceGrid* g) : grid(g) {
     CGridCtrl::SetDragRunner([this](QDrag& d) {
       links.push_back(d.mimeData()->data(hv::drag::kLinkMimeType).toStdString());
       sources.push_back(d.mimeData()->data(hv::drag::kSourceMimeType).toStdString());
+      if (meanwhile) meanwhile();
       if (!dropBack) return Qt::IgnoreAction;
       taken = grid->HandleDrop(d.mimeData(), QPoint(grid->CellRect(0, 0).center().x(), grid->CellRect(0, 0).top() + 2));
       return taken ? Qt::MoveAction : Qt::IgnoreAction;
@@ -689,6 +691,18 @@ TEST_F(PriceView, DragOut_SelectedRowsTravelAsPriceViewLinksAndMoveOnlyInsideThe
   EXPECT_EQ(saved.WatchlistID, 11);
   EXPECT_LT(saved.text.find(L"\"O39\""), saved.text.find(L"\"D05\""));
 
+  // Sorted while the drag is on: the dragged instruments move, wherever the sort put them.
+  grid->ClearSelection();
+  grid->SelectRow(2);  // D05
+  drag.meanwhile = [&] {
+    grid->SortOnColumn(grid->ColumnOf(pricecol::Col::Symbol));  // D05, O39, U11
+  };
+  drag.From(2);
+  drag.meanwhile = nullptr;
+  EXPECT_EQ(Codes(grid), (std::vector<std::wstring>{L"D05", L"O39", L"U11"}));
+  EXPECT_EQ(UserWatchlistStore().FindPtr(L"Banks")->items,
+            (std::vector<InstrumentKey>{{1, L"D05"}, {1, L"O39"}, {1, L"U11"}}));
+
   // A TOP30 list drags out too, but its order is not the user's to change.
   view->OnCommand(CPriceViewAdv::kTop30ButtonId);
   const std::vector<std::wstring> top30 = Codes(grid);
@@ -696,7 +710,7 @@ TEST_F(PriceView, DragOut_SelectedRowsTravelAsPriceViewLinksAndMoveOnlyInsideThe
   grid->SelectRow(1);
   host.ClearRequests();
   drag.From(1);
-  EXPECT_EQ(drag.links.size(), 3u);
+  EXPECT_EQ(drag.links.size(), 4u);
   EXPECT_FALSE(drag.taken);
   EXPECT_EQ(Codes(grid), top30);
   EXPECT_TRUE(host.RequestsOf(hm::SaveUserWatchlist).empty());
@@ -705,7 +719,7 @@ TEST_F(PriceView, DragOut_SelectedRowsTravelAsPriceViewLinksAndMoveOnlyInsideThe
   view->OnCommand(CPriceViewAdv::kWorldButtonId);
   ASSERT_EQ(grid->Rows().size(), 2u);
   drag.From(0);
-  EXPECT_EQ(drag.links.size(), 3u);
+  EXPECT_EQ(drag.links.size(), 4u);
 }
 
 TEST_F(PriceView, Shortcuts_BuyAndSellTheSelectedRowWithItsPriceWhenAboveZero) {
