@@ -3,55 +3,20 @@
 // grid; the book must look like a book.
 #include <gtest/gtest.h>
 
+#include "mvtest/TerminalProcess.h"
+
 #include <QCoreApplication>
 #include <QDir>
 #include <QFile>
-#include <QProcess>
 #include <QStringList>
 #include <QTemporaryDir>
 #include <QFileInfo>
-#include <cstdlib>
-#include <unistd.h>
 
 namespace {
 
-constexpr int kProcessTimeoutMs = 120000;  // a guard against a hung terminal, not a wait
-
-// MV_BIN, else bin/ next to the test's folder (<build>/tests/..).
-QString TerminalPath() {
-  if (const char* bin = std::getenv("MV_BIN"); bin && *bin) return QDir(QString::fromLocal8Bit(bin)).filePath("terminal");
-  char exe[4096];
-  const ssize_t n = readlink("/proc/self/exe", exe, sizeof exe - 1);
-  if (n <= 0) return QString();
-  exe[n] = '\0';
-  QDir dir = QFileInfo(QString::fromLocal8Bit(exe)).dir();
-  return dir.cdUp() ? dir.filePath("bin/terminal") : QString();
-}
-
-struct RunResult {
-  int exitCode = -1;
-  QString out;
-  QString err;
-};
-
-RunResult RunTerminal(const QStringList& args) {
-  QProcess p;
-  QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
-  env.insert("QT_QPA_PLATFORM", "offscreen");
-  p.setProcessEnvironment(env);
-  p.start(TerminalPath(), args);
-  RunResult r;
-  if (!p.waitForFinished(kProcessTimeoutMs)) {
-    p.kill();
-    p.waitForFinished();
-    r.err = "terminal did not finish";
-    return r;
-  }
-  r.exitCode = p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
-  r.out = QString::fromUtf8(p.readAllStandardOutput());
-  r.err = QString::fromUtf8(p.readAllStandardError());
-  return r;
-}
+using mvtest::RunResult;
+using mvtest::RunTerminal;
+using mvtest::TerminalPath;
 
 // The first simulated share that trades on an exchange (not an index list).
 bool PickInstrument(const QString& seed, QString* productId, QString* code) {
@@ -118,12 +83,12 @@ TEST(DepthTerminal, HeadlessDumpShowsAGrownOrderedBook) {
     }
     if (!cells[1].isEmpty()) {
       const double buy = cells[1].toDouble();
-      if (buys++) EXPECT_LT(buy, lastBuy) << "buy prices fall level by level";
+      if (buys++) { EXPECT_LT(buy, lastBuy) << "buy prices fall level by level"; }
       lastBuy = buy;
     }
     if (!cells[2].isEmpty()) {
       const double sell = cells[2].toDouble();
-      if (sells++) EXPECT_GT(sell, lastSell) << "sell prices rise level by level";
+      if (sells++) { EXPECT_GT(sell, lastSell) << "sell prices rise level by level"; }
       lastSell = sell;
     }
     EXPECT_TRUE(!cells[1].isEmpty() || !cells[2].isEmpty()) << "a shown level has a price";

@@ -4,56 +4,22 @@
 // the dump, so both describe the same moment: every row's last, bid and ask
 // must be the market's, formatted with the instrument's decimals.
 #include <gtest/gtest.h>
-#include <unistd.h>
+
+#include "mvtest/TerminalProcess.h"
 
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
 #include <QMap>
 #include <QSet>
-#include <QProcess>
 #include <QStringList>
 #include <QTemporaryDir>
-#include <cstdlib>
 
 namespace {
 
-constexpr int kProcessTimeoutMs = 120000;  // a guard against a hung terminal, not a wait
-
-// MV_BIN, else bin/ next to the test's folder (<build>/tests/..).
-QString TerminalPath() {
-  if (const char* bin = std::getenv("MV_BIN"); bin && *bin) return QDir(QString::fromLocal8Bit(bin)).filePath("terminal");
-  char exe[4096];
-  const ssize_t n = readlink("/proc/self/exe", exe, sizeof exe - 1);
-  if (n <= 0) return QString();
-  exe[n] = '\0';
-  QDir dir = QFileInfo(QString::fromLocal8Bit(exe)).dir();
-  return dir.cdUp() ? dir.filePath("bin/terminal") : QString();
-}
-
-struct RunResult {
-  int exitCode = -1;
-  QString out, err;
-};
-
-RunResult RunTerminal(const QStringList& args) {
-  QProcess p;
-  QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
-  env.insert("QT_QPA_PLATFORM", "offscreen");
-  p.setProcessEnvironment(env);
-  p.start(TerminalPath(), args);
-  RunResult r;
-  if (!p.waitForFinished(kProcessTimeoutMs)) {
-    p.kill();
-    p.waitForFinished();
-    r.err = "terminal did not finish";
-    return r;
-  }
-  r.exitCode = p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
-  r.out = QString::fromUtf8(p.readAllStandardOutput());
-  r.err = QString::fromUtf8(p.readAllStandardError());
-  return r;
-}
+using mvtest::RunResult;
+using mvtest::RunTerminal;
+using mvtest::TerminalPath;
 
 // A TSV file as rows of cells; the first row holds the headings.
 std::vector<QStringList> ReadTsv(const QString& path) {

@@ -2,15 +2,14 @@
 // views open, every dump file comes out byte for byte the same. Bad
 // recordings are refused with the line and the reason.
 #include <gtest/gtest.h>
-#include <unistd.h>
+
+#include "mvtest/TerminalProcess.h"
 
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
-#include <QProcess>
 #include <QStringList>
 #include <QTemporaryDir>
-#include <cstdlib>
 
 namespace {
 
@@ -18,39 +17,10 @@ constexpr int kProcessTimeoutMs = 180000;  // a guard against a hung terminal, n
 const QString kSeed = "4242";
 const QString kSeconds = "8";
 
-QString TerminalPath() {
-  if (const char* bin = std::getenv("MV_BIN"); bin && *bin) return QDir(QString::fromLocal8Bit(bin)).filePath("terminal");
-  char exe[4096];
-  const ssize_t n = readlink("/proc/self/exe", exe, sizeof exe - 1);
-  if (n <= 0) return QString();
-  exe[n] = '\0';
-  QDir dir = QFileInfo(QString::fromLocal8Bit(exe)).dir();
-  return dir.cdUp() ? dir.filePath("bin/terminal") : QString();
-}
+using mvtest::RunResult;
+using mvtest::TerminalPath;
 
-struct RunResult {
-  int exitCode = -1;
-  QString out, err;
-};
-
-RunResult RunTerminal(const QStringList& args) {
-  QProcess p;
-  QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
-  env.insert("QT_QPA_PLATFORM", "offscreen");
-  p.setProcessEnvironment(env);
-  p.start(TerminalPath(), args);
-  RunResult r;
-  if (!p.waitForFinished(kProcessTimeoutMs)) {
-    p.kill();
-    p.waitForFinished();
-    r.err = "terminal did not finish";
-    return r;
-  }
-  r.exitCode = p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
-  r.out = QString::fromUtf8(p.readAllStandardOutput());
-  r.err = QString::fromUtf8(p.readAllStandardError());
-  return r;
-}
+RunResult RunTerminal(const QStringList& args) { return mvtest::RunTerminal(args, kProcessTimeoutMs); }
 
 // "PRODUCTID:CODE" of the first simulated share on SGX.
 QString Share() {
