@@ -612,9 +612,12 @@ void CGridCtrl::mouseMoveEvent(QMouseEvent* e) {
       if ((pt - m_pressPt).manhattanLength() < QApplication::startDragDistance()) return;
       if (m_pressRow == -1 && m_pressCol >= 0 && m_colMoving) m_drag = Drag::ColMove;
       else if (m_pressRow >= 0 && m_pressCol >= 0 && m_dragOut) {
-        // A drag of rows; dropped back here it moves them.
+        // A drag of rows; dropped back here it moves them. Rows that may not
+        // leave are selected by the drag instead.
         m_drag = Drag::None;
-        StartDragOut();
+        if (StartDragOut() || m_selMode != MultiSelection) return;
+        m_drag = Drag::Select;
+        mouseMoveEvent(e);
         return;
       } else if (m_pressRow >= 0 && m_rowMoving) m_drag = Drag::RowMove;
       else { m_drag = Drag::None; return; }
@@ -768,15 +771,15 @@ CGridCtrl::DragRunner& Runner() {
 
 void CGridCtrl::SetDragRunner(DragRunner runner) { Runner() = std::move(runner); }
 
-void CGridCtrl::StartDragOut() {
-  if (m_dragOutRunning) return;
+bool CGridCtrl::StartDragOut() {
+  if (m_dragOutRunning) return false;
   std::vector<int> rows = IsRowSelected(m_pressRow) ? GetSelectedRows() : std::vector<int>{m_pressRow};
   rows.erase(std::remove_if(rows.begin(), rows.end(), [&](int r) { return r < 0 || r >= m_rows; }), rows.end());
-  if (rows.empty()) return;
+  if (rows.empty()) return false;
   auto* mime = new QMimeData;
   if (!OnDragOutData(rows, *mime)) {
     delete mime;
-    return;
+    return false;
   }
   // A token of this grid and this drag: a drop back here is a row move.
   static quint64 serial = 0;
@@ -787,6 +790,20 @@ void CGridCtrl::StartDragOut() {
   m_pressHandled = true;  // the release, if it comes, ends nothing
   auto* drag = new QDrag(this);
   drag->setMimeData(mime);
+  // The pressed row goes with the pointer (a number when there are more).
+  const QRect pressed = CellRect(0, m_pressRow);
+  if (!pressed.isEmpty()) {
+    const QRect strip(0, pressed.top(), std::min(viewport()->width(), 360), pressed.height());
+    QPixmap image = viewport()->grab(strip);
+    if (rows.size() > 1) {
+      QPainter p(&image);
+      p.fillRect(QRect(image.width() - 28, 0, 28, image.height()), m_colors.selBack);
+      p.setPen(m_colors.selText);
+      p.drawText(QRect(image.width() - 28, 0, 28, image.height()), Qt::AlignCenter, QString::number(rows.size()));
+    }
+    drag->setPixmap(image);
+    drag->setHotSpot(QPoint(std::clamp(m_pressPt.x(), 0, image.width() - 1), m_pressPt.y() - strip.top()));
+  }
   QPointer<CGridCtrl> self(this);
   QPointer<QDrag> guard(drag);
   m_dragOutRunning = true;
@@ -794,7 +811,7 @@ void CGridCtrl::StartDragOut() {
   const Qt::DropAction action =
       Runner() ? Runner()(*drag) : drag->exec(Qt::CopyAction | Qt::MoveAction, Qt::CopyAction);
   if (guard) guard->deleteLater();
-  if (!self) return;  // closed while the drag ran
+  if (!self) return true;  // closed while the drag ran
   m_dragOutRunning = false;
   viewport()->setAcceptDrops(false);
   m_dropTarget = -1;
@@ -802,6 +819,7 @@ void CGridCtrl::StartDragOut() {
   m_outToken.clear();
   viewport()->update();
   OnDragOutDone(action);
+  return true;
 }
 
 bool CGridCtrl::HandleDragOver(const QMimeData* mime, const QPoint& pt) {

@@ -293,7 +293,8 @@ class CGridCtrl : public QAbstractScrollArea {
   void LeaveHover();
   void MoveCurrentBy(int dCol, int dRow, Qt::KeyboardModifiers mods);
   void PositionEditor();
-  void StartDragOut();
+  // False when the rows may not go (nothing was dragged).
+  bool StartDragOut();
   // Moves `rows` before `to` when that changes anything and the grid agrees.
   void MoveRowsTo(std::vector<int> rows, int to);
   int RowInsertionAt(const QPoint& pt) const;

@@ -596,11 +596,12 @@ TEST_F(GridTest, Grid_RowsDraggedOutCarryTheSelectionAndMoveOnlyWhenDroppedBackO
   QMimeData foreign;
   foreign.setData(CGridCtrl::kOwnRowsMimeType, "someone-else");
   EXPECT_FALSE(g.HandleDrop(&foreign, dropAt));
-  // A grid that refuses the rows starts no drag.
+  // A grid that refuses the rows starts no drag: the same gesture selects rows.
   g.refuse = true;
   const std::size_t before = payloads.size();
   Drag(g, CellCenter(g, 0, 3), CellCenter(g, 0, 8));
   EXPECT_EQ(payloads.size(), before);
+  EXPECT_EQ(g.GetSelectedRows(), (std::vector<int>{3, 4, 5, 6, 7, 8}));
 }
 
 }  // namespace
