@@ -7,6 +7,7 @@
 #include <string>
 
 #include "terminal/host/HostRuntime.h"
+#include "terminal/host/InstrumentNotices.h"
 #include "terminal/host/MarketSource.h"
 #include "terminal/host/RecordingSource.h"
 #include "terminal/host/ReplaySource.h"
@@ -52,6 +53,7 @@ struct HostCore {
   std::unique_ptr<std::ofstream> trace;  // --trace-messages
   std::unique_ptr<UserData> user;
   std::unique_ptr<SubscriptionBook> subscriptions;
+  std::unique_ptr<InstrumentNotices> instrumentNotices;  // 414 to the leading price view
   RequestTable requests;
 
   bool relaying300 = false;

@@ -4,6 +4,7 @@
 // pump. Each pump pushes (410) what the market changed, once per subscription
 // and field, and only for fields the change can move.
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <set>
 #include <string>
@@ -36,6 +37,10 @@ class SubscriptionBook {
   // Forgets everything of `view`.
   void Drop(CSuperBaseView* view);
   std::size_t Count() const { return index_.size(); }
+  // Called in Pump with every change the market reported, before the pushes
+  // (the changes of names and remarks go to the leading price view as 414).
+  using ChangeObserver = std::function<void(const std::vector<std::pair<int, std::uint32_t>>&)>;
+  void SetChangeObserver(ChangeObserver observer) { observer_ = std::move(observer); }
   // The market indexes of the instruments with a quote subscription (kind 0,
   // param 0) of any view, each once, in subscription order.
   std::vector<int> QuoteInstruments() const;
@@ -85,6 +90,7 @@ class SubscriptionBook {
   std::unordered_map<CSuperBaseView*, Pending> pending_;
   std::vector<Fetch> fetches_;
   std::set<std::pair<std::int64_t, std::string>> unknownLogged_;
+  ChangeObserver observer_;
 };
 
 }  // namespace term
