@@ -3,7 +3,7 @@
 // the numbers it receives but leaves alone (413, 553, 606, 622).
 #include "ViewHarness.h"
 
-MV_VIEW_HARNESS("CPriceViewAdv", {hm::WatchlistsLoaded, 414, hm::WatchlistList, hm::SaveWatchlistNames,
+MV_VIEW_HARNESS("CPriceViewAdv", {hm::WatchlistsLoaded, hm::InstrumentFieldUpdate, hm::WatchlistList, hm::SaveWatchlistNames,
                                    hm::WatchlistGroups520, hm::WatchlistGroups521, hm::WatchlistRows522,
                                    hm::RemarkMessages, hm::FontSizeMenu, hm::Sectors, hm::CompactLayout,
                                    hm::PriceViewRequest413, hm::PriceViewRequest553, hm::Watchlist606,

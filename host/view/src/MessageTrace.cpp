@@ -196,7 +196,7 @@ Shape ShapeOf(UINT message) {
     case hm::LinkData: return Shape::Link;
     case hm::FieldValue:
     case hm::RequestField:
-    case 414: return Shape::Field;  // the price views' relay of a field update
+    case hm::InstrumentFieldUpdate: return Shape::Field;
     case hm::InstrumentList: return Shape::Instruments;
     case hm::ExchangeList: return Shape::Exchanges;
     case hm::RemarkMessages: return Shape::Remarks;

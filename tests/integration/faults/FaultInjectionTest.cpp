@@ -134,7 +134,7 @@ void AddListFaults(std::vector<Fault>& out, UINT message, const std::function<Ro
 
 // The price view's field relay (414): the leading price view writes it into
 // the quote store, and "INSTRNAME" into the instrument record.
-constexpr UINT kRelayedField = 414;
+constexpr UINT kRelayedField = hm::InstrumentFieldUpdate;
 
 // The price view's own numbers: the watchlist reload (300 with a family), the
 // relayed field (414), the acknowledged ids (611), and the numbers it only
