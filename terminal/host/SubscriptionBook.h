@@ -4,6 +4,7 @@
 // pump. Each pump pushes (410) what the market changed, once per subscription
 // and field, and only for fields the change can move.
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <set>
 #include <string>
@@ -36,6 +37,8 @@ class SubscriptionBook {
   // Forgets everything of `view`.
   void Drop(CSuperBaseView* view);
   std::size_t Count() const { return index_.size(); }
+  // Called just before each 410 reaches its view (measurements); may be empty.
+  void SetPushObserver(std::function<void(CSuperBaseView*)> observer) { onPush_ = std::move(observer); }
   // The market indexes of the instruments with a quote subscription (kind 0,
   // param 0) of any view, each once, in subscription order.
   std::vector<int> QuoteInstruments() const;
@@ -84,6 +87,7 @@ class SubscriptionBook {
   std::unordered_map<int, std::vector<std::size_t>> byInstrument_;
   std::unordered_map<CSuperBaseView*, Pending> pending_;
   std::vector<Fetch> fetches_;
+  std::function<void(CSuperBaseView*)> onPush_;
   std::set<std::pair<std::int64_t, std::string>> unknownLogged_;
 };
 
