@@ -129,7 +129,7 @@ Found Inspect(Store& store, const std::vector<JInstrumentUnderlying>& instrument
     if (g >= 0 && SameAlerts(alerts, Alerts(g, instruments))) f.alerts = g;
     else f.problems.push_back("the alerts are not one whole generation (" + std::to_string(alerts.size()) +
                               " alerts, the first \"" + alerts.front().hostTextB + "\")");
-  } else if (alertsSaved && f.watchlists >= 0) {
+  } else if (alertsSaved) {
     f.problems.push_back("the alerts were saved but are empty");
   }
   // Settings.

@@ -1,0 +1,33 @@
+# Shared by scripts/soak, scripts/latency and scripts/crash-churn (sourced).
+root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
+terminal="${MV_BIN:-$root/build/bin}/terminal"
+
+# Builds the terminal and the add-on when the build tree is there, else sets it up.
+build_terminal() {
+  if [ -f "$root/build/build.ninja" ]; then
+    cmake --build "$root/build" --target terminal marketviews >/dev/null
+  else
+    "$root/scripts/setup.sh" build build -DCMAKE_BUILD_TYPE=RelWithDebInfo >/dev/null
+  fi
+}
+
+# "PRODUCTID:CODE" of the busiest stock, the one a first start shows: a
+# zero-second run with the first-start layout dumps the market of what it shows.
+busiest_stock() {
+  local dir
+  dir=$(mktemp -d /tmp/mv-busiest.XXXXXX)
+  "$terminal" --headless --no-restore --seconds 0 --data-dir "$dir/data" --dump "$dir/dump" >/dev/null 2>&1
+  local file code
+  file=$(ls "$dir/dump" | grep '^market-trades-' | head -n 1)
+  code=${file#market-trades-}; code=${code%.tsv}
+  rm -rf "$dir"
+  [ -n "$code" ] || { echo "cannot find the busiest stock" >&2; return 1; }
+  "$terminal" --list-instruments | awk -F'\t' -v c="$code" '$2 == c { print $1 ":" $2; exit }'
+}
+
+# The six add-on views, the price view twice (one a board), on `$1`.
+six_views() {
+  echo --open CPriceViewAdv --open CPriceViewAdv --param User_field_display_mode=Board \
+       --open "CMarketDepthAdv:$1" --open "CTimeAndSalesAdv:$1" --open "CTradeSummaryAdv:$1" \
+       --open CPriceAlertList --open CNewPriceAlertAdv
+}
