@@ -11,6 +11,16 @@ build_terminal() {
   fi
 }
 
+# Copies the terminal and the add-on into `$1` and points `terminal` at the
+# copy, so a rebuild during a long run does not pull the files from under it.
+stage_terminal() {
+  mkdir -p "$1/bin" "$1/lib"
+  cp "$terminal" "$1/bin/terminal"
+  cp "$(dirname "$terminal")"/../lib/*.so "$1/lib/"
+  export LD_LIBRARY_PATH="$1/lib${LD_LIBRARY_PATH:+:$LD_LIBRARY_PATH}"
+  terminal="$1/bin/terminal"
+}
+
 # "PRODUCTID:CODE" of the busiest stock, the one a first start shows: a
 # zero-second run with the first-start layout dumps the market of what it shows.
 busiest_stock() {

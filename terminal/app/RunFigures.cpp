@@ -84,8 +84,9 @@ std::string LatencyRecorder::Report(const std::string& title) const {
   return out.str();
 }
 
-void SoakFigures::SampleRss(double simulatedSeconds, std::int64_t rssKb) {
+void SoakFigures::SampleRss(double simulatedSeconds, std::int64_t rssKb, std::int64_t marketKb) {
   m_samples.emplace_back(simulatedSeconds, rssKb);
+  m_market.emplace_back(simulatedSeconds, marketKb);
 }
 
 void SoakFigures::Turn(std::int64_t wallUs, std::int64_t cpuUs) {
@@ -93,9 +94,12 @@ void SoakFigures::Turn(std::int64_t wallUs, std::int64_t cpuUs) {
   m_cpu.Add(cpuUs);
 }
 
-double SoakFigures::RssGrowthMbPerHour(double warmupSeconds) const {
+double SoakFigures::RssGrowthMbPerHour(double warmupSeconds) const { return Slope(m_samples, warmupSeconds); }
+double SoakFigures::MarketGrowthMbPerHour(double warmupSeconds) const { return Slope(m_market, warmupSeconds); }
+
+double SoakFigures::Slope(const std::vector<std::pair<double, std::int64_t>>& samples, double warmupSeconds) {
   double n = 0, sx = 0, sy = 0, sxx = 0, sxy = 0;
-  for (const auto& [t, kb] : m_samples) {
+  for (const auto& [t, kb] : samples) {
     if (t < warmupSeconds) continue;
     const double x = t / 3600.0, y = static_cast<double>(kb) / 1024.0;
     n += 1;
@@ -124,6 +128,12 @@ std::string SoakFigures::Report(double warmupSeconds, double stepMs) const {
   std::snprintf(line, sizeof line, "rss_growth_mb_per_hour\t%.2f\t(least squares over the samples from %.0f s on)\n",
                 RssGrowthMbPerHour(warmupSeconds), warmupSeconds);
   out << line;
+  const double market = MarketGrowthMbPerHour(warmupSeconds);
+  std::snprintf(line, sizeof line,
+                "market_tapes_growth_mb_per_hour\t%.2f\t(the simulated exchange's day tapes)\n"
+                "rss_growth_without_market_tapes_mb_per_hour\t%.2f\n",
+                market, RssGrowthMbPerHour(warmupSeconds) - market);
+  out << line;
   std::snprintf(line, sizeof line, "rss_mb_after_warmup\t%.1f\nrss_mb_at_end\t%.1f\nrss_mb_peak\t%.1f\n",
                 static_cast<double>(first) / 1024.0, static_cast<double>(last) / 1024.0,
                 static_cast<double>(peak) / 1024.0);
@@ -139,9 +149,10 @@ std::string SoakFigures::Report(double warmupSeconds, double stepMs) const {
   out << "turn_wall_ms_worst\t" << Ms(m_wall.WorstUs()) << "\n";
   out << "turn_cpu_ms_p99\t" << Ms(m_cpu.PercentileUs(0.99)) << "\n";
   out << "turn_cpu_ms_worst\t" << Ms(m_cpu.WorstUs()) << "\n";
-  out << "# rss_kb samples: simulated seconds, kB\n";
-  for (const auto& [t, kb] : m_samples) {
-    std::snprintf(line, sizeof line, "rss_kb\t%.0f\t%lld\n", t, static_cast<long long>(kb));
+  out << "# rss_kb samples: simulated seconds, resident kB, kB in the simulated exchange's tapes\n";
+  for (std::size_t k = 0; k < m_samples.size(); ++k) {
+    std::snprintf(line, sizeof line, "rss_kb\t%.0f\t%lld\t%lld\n", m_samples[k].first,
+                  static_cast<long long>(m_samples[k].second), static_cast<long long>(m_market[k].second));
     out << line;
   }
   return out.str();

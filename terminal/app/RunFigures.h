@@ -66,7 +66,8 @@ class LatencyRecorder {
 // every turn of the event loop.
 class SoakFigures {
  public:
-  void SampleRss(double simulatedSeconds, std::int64_t rssKb);
+  // `marketKb`: what the simulated exchange's own day tapes hold then.
+  void SampleRss(double simulatedSeconds, std::int64_t rssKb, std::int64_t marketKb = 0);
   // One turn: everything the event loop ran for one step of simulated time.
   void Turn(std::int64_t wallUs, std::int64_t cpuUs);
   // The values pushed to the views over the run (410s), for the report.
@@ -75,13 +76,17 @@ class SoakFigures {
   // Least-squares slope of the samples taken at or after `warmupSeconds`, in
   // MB (1024 kB) per simulated hour; 0 with fewer than two samples.
   double RssGrowthMbPerHour(double warmupSeconds) const;
+  // The same for the simulated exchange's tapes.
+  double MarketGrowthMbPerHour(double warmupSeconds) const;
   const DurationStats& TurnWall() const { return m_wall; }
   const DurationStats& TurnCpu() const { return m_cpu; }
   const std::vector<std::pair<double, std::int64_t>>& Samples() const { return m_samples; }
   std::string Report(double warmupSeconds, double stepMs) const;
+  static double Slope(const std::vector<std::pair<double, std::int64_t>>& samples, double warmupSeconds);
 
  private:
   std::vector<std::pair<double, std::int64_t>> m_samples;
+  std::vector<std::pair<double, std::int64_t>> m_market;
   DurationStats m_wall, m_cpu;
   std::uint64_t m_pushes = 0;
   double m_seconds = 0;

@@ -6,7 +6,8 @@
 // after a kill: every set must be exactly the content of one generation (never
 // lost, empty or half-written), none older than MIN (the last one said to be
 // committed), and in saving order (watchlists >= alerts >= settings >= layout
-// >= watchlists - 1).
+// >= watchlists - 1). A run starts by saving the newest generation in the
+// store again (a killed run may have saved only part of it).
 #include <cstdint>
 #include <string>
 #include <vector>

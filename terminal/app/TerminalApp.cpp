@@ -267,7 +267,9 @@ bool TerminalApp::Start(std::string& error) {
       error = "--save-churn needs the store";
       return false;
     }
-    m_churnGeneration = churn::Inspect(*m_store, m_runtime->Market().Instruments()).Newest() + 1;
+    // A run killed inside a generation left some sets at it and the rest one
+    // behind: the next run saves that generation again, whole, and goes on.
+    m_churnGeneration = std::max<std::int64_t>(0, churn::Inspect(*m_store, m_runtime->Market().Instruments()).Newest());
   }
   if (m_latency) {
     // A view behind another's tab is never drawn: for the measurement every
@@ -618,7 +620,7 @@ int TerminalApp::RunTimed() {
            std::to_string(m_window->Docks().size()) + " views");
   if (!m_options.soakReport.empty()) {
     m_soak = std::make_unique<SoakFigures>();
-    m_soak->SampleRss(0, ReadRssKb());
+    m_soak->SampleRss(0, ReadRssKb(), static_cast<std::int64_t>(m_runtime->Market().TapeBytes() / 1024));
   }
   const long long sampleEvery = static_cast<long long>(kSoakSampleSeconds * 1000 / kPumpMs);
   for (long long i = 0; i < steps && !m_shutDown && !m_stopRequested; ++i) {
@@ -630,7 +632,9 @@ int TerminalApp::RunTimed() {
     QCoreApplication::processEvents();
     if (m_soak) {
       m_soak->Turn(WallUs() - wall0, ThreadCpuUs() - cpu0);
-      if ((i + 1) % sampleEvery == 0) m_soak->SampleRss(static_cast<double>(i + 1) * kPumpMs / 1000.0, ReadRssKb());
+      if ((i + 1) % sampleEvery == 0)
+        m_soak->SampleRss(static_cast<double>(i + 1) * kPumpMs / 1000.0, ReadRssKb(),
+                          static_cast<std::int64_t>(m_runtime->Market().TapeBytes() / 1024));
     }
     if (m_options.saveChurn && !ChurnStep()) return 1;
   }

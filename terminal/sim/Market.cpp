@@ -1150,6 +1150,12 @@ std::vector<DepthLevel> Market::Book(int index, int levels) {
   return out;
 }
 
+std::size_t Market::TapeBytes() const {
+  std::size_t bytes = d->tapes.capacity() * sizeof(std::vector<Trade>);
+  for (const auto& tape : d->tapes) bytes += tape.capacity() * sizeof(Trade);
+  return bytes;
+}
+
 const std::vector<Trade>& Market::Trades(int index) {
   static const std::vector<Trade> none;
   if (index < 0 || index >= int(d->instruments.size())) return none;

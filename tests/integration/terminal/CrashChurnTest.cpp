@@ -58,7 +58,7 @@ TEST(CrashChurn, EverySetIsOldOrNewAfterEachKillAndTheNextRunCarriesOn) {
     EXPECT_EQ(check.exitCode, 0) << check.out.toStdString() << check.err.toStdString();
     EXPECT_TRUE(check.out.contains(": ok")) << check.out.toStdString();
   }
-  EXPECT_GE(committed, 11);
+  EXPECT_GE(committed, 8);  // each run first saves the newest generation again
 }
 
 TEST(CrashChurn, TheCheckRefusesAStoreThatLostWhatWasCommitted) {
