@@ -27,12 +27,17 @@ busiest_stock() {
   local dir
   dir=$(mktemp -d /tmp/mv-busiest.XXXXXX)
   "$terminal" --headless --no-restore --seconds 0 --data-dir "$dir/data" --dump "$dir/dump" >/dev/null 2>&1
-  local file code
-  file=$(ls "$dir/dump" | grep '^market-trades-' | head -n 1)
-  code=${file#market-trades-}; code=${code%.tsv}
+  local files code
+  files=("$dir"/dump/market-trades-*.tsv)
+  if [ ! -e "${files[0]}" ]; then
+    rm -rf "$dir"
+    echo "cannot find the busiest stock" >&2
+    return 1
+  fi
+  code=$(basename "${files[0]}" .tsv); code=${code#market-trades-}
   rm -rf "$dir"
-  [ -n "$code" ] || { echo "cannot find the busiest stock" >&2; return 1; }
-  "$terminal" --list-instruments | awk -F'\t' -v c="$code" '$2 == c { print $1 ":" $2; exit }'
+  # The whole list is read (an early exit would break the terminal's pipe).
+  "$terminal" --list-instruments | awk -F'\t' -v c="$code" '$2 == c && !n++ { print $1 ":" $2 }'
 }
 
 # The six add-on views, the price view twice (one a board), on `$1`.
