@@ -141,6 +141,8 @@ std::string SoakFigures::Report(double warmupSeconds, double stepMs) const {
   std::snprintf(line, sizeof line, "pushes\t%llu\t(%.0f a second)\n", static_cast<unsigned long long>(m_pushes),
                 m_seconds > 0 ? static_cast<double>(m_pushes) / m_seconds : 0.0);
   out << line;
+  std::snprintf(line, sizeof line, "subscriptions_at_end\t%llu\n", static_cast<unsigned long long>(m_subscriptions));
+  out << line;
   std::snprintf(line, sizeof line, "turns\t%llu\t(one turn: %.0f ms of simulated time)\n",
                 static_cast<unsigned long long>(m_wall.Count()), stepMs);
   out << line;

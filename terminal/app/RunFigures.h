@@ -72,6 +72,8 @@ class SoakFigures {
   void Turn(std::int64_t wallUs, std::int64_t cpuUs);
   // The values pushed to the views over the run (410s), for the report.
   void SetPushes(std::uint64_t pushes, double simulatedSeconds) { m_pushes = pushes; m_seconds = simulatedSeconds; }
+  // The field subscriptions the host keeps at the end (each holds the last text sent).
+  void SetSubscriptions(std::uint64_t count) { m_subscriptions = count; }
 
   // Least-squares slope of the samples taken at or after `warmupSeconds`, in
   // MB (1024 kB) per simulated hour; 0 with fewer than two samples.
@@ -89,6 +91,7 @@ class SoakFigures {
   std::vector<std::pair<double, std::int64_t>> m_market;
   DurationStats m_wall, m_cpu;
   std::uint64_t m_pushes = 0;
+  std::uint64_t m_subscriptions = 0;
   double m_seconds = 0;
 };
 

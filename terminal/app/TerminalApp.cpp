@@ -640,6 +640,7 @@ int TerminalApp::RunTimed() {
   }
   if (m_soak) {
     m_soak->SetPushes(m_runtime->Stats().pushes, seconds);
+    m_soak->SetSubscriptions(m_runtime->Stats().subscriptions);
     if (!WriteSoakReport(kSoakWarmupSeconds)) return 1;
   }
   SettleViews();
