@@ -1,7 +1,11 @@
 #include "grid/GridCtrl.h"
 
 #include <QApplication>
+#include <QDrag>
+#include <QDropEvent>
 #include <QHelpEvent>
+#include <QMimeData>
+#include <QPointer>
 #include <QKeyEvent>
 #include <QLineEdit>
 #include <QMouseEvent>
@@ -397,7 +401,7 @@ void CGridCtrl::PaintTo(QPainter& p, const QRect& clip) {
   if (m_drag == Drag::ColMove && m_dropTarget >= 0) {
     const int x = m_sideWidth + (m_dropTarget < nCols ? m_colPos[std::size_t(m_dropTarget)] : TotalColWidth()) - hOff;
     p.fillRect(QRect(x - 1, 0, 3, H), m_colors.selBack.darker(150));
-  } else if (m_drag == Drag::RowMove && m_dropTarget >= 0) {
+  } else if ((m_drag == Drag::RowMove || m_dragOutRunning) && m_dropTarget >= 0) {
     const int y = m_headHeight + m_dropTarget * m_rowHeight - vOff;
     p.fillRect(QRect(0, y - 1, W, 3), m_colors.selBack.darker(150));
   }
@@ -572,7 +576,7 @@ void CGridCtrl::mousePressEvent(QMouseEvent* e) {
   // A data cell.
   const bool ctrl = e->modifiers() & Qt::ControlModifier;
   const bool shift = e->modifiers() & Qt::ShiftModifier;
-  const bool keepSelection = m_rowMoving && IsRowSelected(row) && !ctrl && !shift && m_selCount > 1;
+  const bool keepSelection = (m_rowMoving || m_dragOut) && IsRowSelected(row) && !ctrl && !shift && m_selCount > 1;
   if (m_selMode == MultiSelection && shift && m_anchorRow >= 0) SelectRange(m_anchorRow, row);
   else if (m_selMode == MultiSelection && ctrl) {
     if (IsRowSelected(row)) { m_selected[std::size_t(row)] = 0; --m_selCount; viewport()->update(); }
@@ -593,7 +597,7 @@ void CGridCtrl::mousePressEvent(QMouseEvent* e) {
   m_pressHandled = type->OnLClicked(col, row, true, rect, pt);
   if (!m_pressHandled) OnLClicked(col, row, true, rect, pt);
   if (type->HandlesMouse()) return;
-  if (m_rowMoving && !ctrl && !shift) m_drag = Drag::Pending;
+  if ((m_rowMoving || m_dragOut) && !ctrl && !shift) m_drag = Drag::Pending;
   else if (m_selMode == MultiSelection && !ctrl) m_drag = Drag::Select;
 }
 
@@ -607,7 +611,15 @@ void CGridCtrl::mouseMoveEvent(QMouseEvent* e) {
     case Drag::Pending: {
       if ((pt - m_pressPt).manhattanLength() < QApplication::startDragDistance()) return;
       if (m_pressRow == -1 && m_pressCol >= 0 && m_colMoving) m_drag = Drag::ColMove;
-      else if (m_pressRow >= 0 && m_rowMoving) m_drag = Drag::RowMove;
+      else if (m_pressRow >= 0 && m_pressCol >= 0 && m_dragOut) {
+        // A drag of rows; dropped back here it moves them. Rows that may not
+        // leave are selected by the drag instead.
+        m_drag = Drag::None;
+        if (StartDragOut() || m_selMode != MultiSelection) return;
+        m_drag = Drag::Select;
+        mouseMoveEvent(e);
+        return;
+      } else if (m_pressRow >= 0 && m_rowMoving) m_drag = Drag::RowMove;
       else { m_drag = Drag::None; return; }
       viewport()->setCursor(Qt::DragMoveCursor);
       [[fallthrough]];
@@ -701,22 +713,9 @@ void CGridCtrl::mouseReleaseEvent(QMouseEvent* e) {
     }
     viewport()->update();
   } else if (drag == Drag::RowMove) {
-    std::vector<int> rows = IsRowSelected(pressRow) ? GetSelectedRows() : std::vector<int>{pressRow};
     const int to = m_dropTarget;
     m_dropTarget = -1;
-    // A drop inside or right after a single contiguous block changes nothing.
-    const bool contiguous = rows.back() - rows.front() + 1 == int(rows.size());
-    const bool noop = contiguous && to >= rows.front() && to <= rows.back() + 1;
-    if (to >= 0 && !noop && OnCanMoveRows(rows, to)) {
-      OnRowsMoved(rows, to);
-      int before = 0;
-      for (int r : rows) if (r < to) ++before;
-      const int first = to - before;
-      SelectRange(first, first + int(rows.size()) - 1);
-      m_anchorRow = first;
-      SetCurrent(m_curCol, first);
-      NotifySelection();
-    }
+    MoveRowsTo(IsRowSelected(pressRow) ? GetSelectedRows() : std::vector<int>{pressRow}, to);
     viewport()->update();
   }
 
@@ -737,6 +736,119 @@ void CGridCtrl::mouseReleaseEvent(QMouseEvent* e) {
   if (pressHandled) return;
   if (pressRow == -1 && pressCol >= 0) OnTH_LClicked(row == -1 && col >= 0 ? col : -1, false, rect, pt);
   else if (pressRow >= 0 && pressCol >= 0) OnLClicked(row >= 0 && col >= 0 ? col : -1, row >= 0 && col >= 0 ? row : -1, false, rect, pt);
+}
+
+void CGridCtrl::MoveRowsTo(std::vector<int> rows, int to) {
+  rows.erase(std::remove_if(rows.begin(), rows.end(), [&](int r) { return r < 0 || r >= m_rows; }), rows.end());
+  if (rows.empty() || to < 0) return;
+  // A drop inside or right after a single contiguous block changes nothing.
+  const bool contiguous = rows.back() - rows.front() + 1 == int(rows.size());
+  const bool noop = contiguous && to >= rows.front() && to <= rows.back() + 1;
+  if (noop || !OnCanMoveRows(rows, to)) return;
+  OnRowsMoved(rows, to);
+  int before = 0;
+  for (int r : rows) if (r < to) ++before;
+  const int first = to - before;
+  SelectRange(first, first + int(rows.size()) - 1);
+  m_anchorRow = first;
+  SetCurrent(m_curCol, first);
+  NotifySelection();
+}
+
+int CGridCtrl::RowInsertionAt(const QPoint& pt) const {
+  const long long y = static_cast<long long>(pt.y()) - m_headHeight + verticalScrollBar()->value();
+  return y < 0 ? 0 : int(std::min<long long>(m_rows, (y + m_rowHeight / 2) / m_rowHeight));
+}
+
+// ---- Dragging rows out ------------------------------------------------------
+
+namespace {
+CGridCtrl::DragRunner& Runner() {
+  static CGridCtrl::DragRunner runner;
+  return runner;
+}
+}  // namespace
+
+void CGridCtrl::SetDragRunner(DragRunner runner) { Runner() = std::move(runner); }
+
+bool CGridCtrl::StartDragOut() {
+  if (m_dragOutRunning) return false;
+  std::vector<int> rows = IsRowSelected(m_pressRow) ? GetSelectedRows() : std::vector<int>{m_pressRow};
+  rows.erase(std::remove_if(rows.begin(), rows.end(), [&](int r) { return r < 0 || r >= m_rows; }), rows.end());
+  if (rows.empty()) return false;
+  auto* mime = new QMimeData;
+  if (!OnDragOutData(rows, *mime)) {
+    delete mime;
+    return false;
+  }
+  // A token of this grid and this drag: a drop back here is a row move.
+  static quint64 serial = 0;
+  m_outToken = QByteArray::number(quintptr(this), 16) + '-' + QByteArray::number(++serial);
+  mime->setData(kOwnRowsMimeType, m_outToken);
+  m_outRows = rows;
+  m_pressType = nullptr;
+  m_pressHandled = true;  // the release, if it comes, ends nothing
+  auto* drag = new QDrag(this);
+  drag->setMimeData(mime);
+  // The pressed row goes with the pointer (a number when there are more).
+  const QRect pressed = CellRect(0, m_pressRow);
+  if (!pressed.isEmpty()) {
+    const QRect strip(0, pressed.top(), std::min(viewport()->width(), 360), pressed.height());
+    QPixmap image = viewport()->grab(strip);
+    if (rows.size() > 1) {
+      QPainter p(&image);
+      p.fillRect(QRect(image.width() - 28, 0, 28, image.height()), m_colors.selBack);
+      p.setPen(m_colors.selText);
+      p.drawText(QRect(image.width() - 28, 0, 28, image.height()), Qt::AlignCenter, QString::number(rows.size()));
+    }
+    drag->setPixmap(image);
+    drag->setHotSpot(QPoint(std::clamp(m_pressPt.x(), 0, image.width() - 1), m_pressPt.y() - strip.top()));
+  }
+  QPointer<CGridCtrl> self(this);
+  QPointer<QDrag> guard(drag);
+  m_dragOutRunning = true;
+  viewport()->setAcceptDrops(true);
+  const Qt::DropAction action =
+      Runner() ? Runner()(*drag) : drag->exec(Qt::CopyAction | Qt::MoveAction, Qt::CopyAction);
+  if (guard) guard->deleteLater();
+  if (!self) return true;  // closed while the drag ran
+  m_dragOutRunning = false;
+  viewport()->setAcceptDrops(false);
+  m_dropTarget = -1;
+  m_outRows.clear();
+  m_outToken.clear();
+  viewport()->update();
+  OnDragOutDone(action);
+  return true;
+}
+
+bool CGridCtrl::HandleDragOver(const QMimeData* mime, const QPoint& pt) {
+  const bool own = m_dragOutRunning && mime && mime->data(kOwnRowsMimeType) == m_outToken && !m_outToken.isEmpty();
+  if (!own || !m_rowMoving) {
+    HandleDragLeave();
+    return false;
+  }
+  m_dropTarget = RowInsertionAt(pt);
+  if (pt.y() < m_headHeight) verticalScrollBar()->triggerAction(QAbstractSlider::SliderSingleStepSub);
+  else if (pt.y() >= viewport()->height() - m_rowHeight / 2)
+    verticalScrollBar()->triggerAction(QAbstractSlider::SliderSingleStepAdd);
+  viewport()->update();
+  return true;
+}
+
+void CGridCtrl::HandleDragLeave() {
+  if (m_dropTarget < 0) return;
+  m_dropTarget = -1;
+  viewport()->update();
+}
+
+bool CGridCtrl::HandleDrop(const QMimeData* mime, const QPoint& pt) {
+  if (!HandleDragOver(mime, pt)) return false;
+  const int to = m_dropTarget;
+  m_dropTarget = -1;
+  MoveRowsTo(m_outRows, to);
+  viewport()->update();
+  return true;
 }
 
 void CGridCtrl::mouseDoubleClickEvent(QMouseEvent* e) {
@@ -777,6 +889,30 @@ bool CGridCtrl::viewportEvent(QEvent* e) {
     case QEvent::Leave:
       LeaveHover();
       break;
+    case QEvent::DragEnter:
+    case QEvent::DragMove: {
+      auto* de = static_cast<QDragMoveEvent*>(e);
+      if (HandleDragOver(de->mimeData(), de->position().toPoint())) {
+        de->setDropAction(Qt::MoveAction);
+        de->accept();
+      } else {
+        de->ignore();
+      }
+      return true;
+    }
+    case QEvent::DragLeave:
+      HandleDragLeave();
+      return true;
+    case QEvent::Drop: {
+      auto* de = static_cast<QDropEvent*>(e);
+      if (HandleDrop(de->mimeData(), de->position().toPoint())) {
+        de->setDropAction(Qt::MoveAction);
+        de->accept();
+      } else {
+        de->ignore();
+      }
+      return true;
+    }
     default: break;
   }
   return QAbstractScrollArea::viewportEvent(e);

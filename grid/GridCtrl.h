@@ -26,6 +26,7 @@
 #include <QPointer>
 #include <algorithm>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <unordered_map>
 #include <vector>
@@ -33,7 +34,10 @@
 #include "grid/GridCell.h"
 #include "grid/GridCellType.h"
 
+class QDrag;
+class QDropEvent;
 class QLineEdit;
+class QMimeData;
 class IStyleManager;
 
 class CGridCtrl : public QAbstractScrollArea {
@@ -175,6 +179,28 @@ class CGridCtrl : public QAbstractScrollArea {
   // Moves column `from` to position `to` (widths and stored cells move with it).
   void MoveColumn(int from, int to);
 
+  // ---- Dragging rows out ----
+  // With drag-out on, a press on a data row and a move beyond the start
+  // distance drags the selected rows (the pressed row alone when it is not
+  // selected) out of the grid: OnDragOutData fills the payload, the drag
+  // runner runs the drag. Dropped back on the grid, the rows move there when
+  // row moving is on (OnCanMoveRows, OnRowsMoved, as a move by mouse); a drop
+  // elsewhere is the target's to take or refuse.
+  void EnableDragOut(bool on) { m_dragOut = on; }
+  bool DragOutEnabled() const { return m_dragOut; }
+  // Runs a drag to its end and returns the drop's action (IgnoreAction: not
+  // dropped or refused). The default executes the QDrag (Copy, or Move onto
+  // the grid itself). Tests install their own; null restores the default.
+  using DragRunner = std::function<Qt::DropAction(QDrag& drag)>;
+  static void SetDragRunner(DragRunner runner);
+  // The mime type that marks a grid's own rows in its drag.
+  static constexpr const char* kOwnRowsMimeType = "application/x-marketviews-grid-rows";
+  // A drag over or dropped on the grid (what the viewport receives): true
+  // when the grid takes it. Used by the viewport's events and by tests.
+  bool HandleDragOver(const QMimeData* mime, const QPoint& viewportPt);
+  bool HandleDrop(const QMimeData* mime, const QPoint& viewportPt);
+  void HandleDragLeave();
+
   // ---- Called by cell types ----
   void SetGridCursor(Qt::CursorShape shape);
   Qt::CursorShape GridCursor() const { return m_cursor; }
@@ -218,6 +244,11 @@ class CGridCtrl : public QAbstractScrollArea {
   // (GetNumberRows(): the end). See ApplyRowMove. The engine keeps no row data.
   virtual bool OnCanMoveRows(const std::vector<int>& rows, int to) { return true; }
   virtual void OnRowsMoved(const std::vector<int>& rows, int to) {}
+  // A drag of `rows` (ascending) out of the grid starts: fill `mime`, or
+  // return false to drag nothing. After the drag, OnDragOutDone with the
+  // drop's action (IgnoreAction when nothing took it).
+  virtual bool OnDragOutData(const std::vector<int>& rows, QMimeData& mime) { return false; }
+  virtual void OnDragOutDone(Qt::DropAction action) {}
   // A key; true consumes it (the engine then does nothing with it).
   virtual bool OnKeyDown(int key, Qt::KeyboardModifiers mods) { return false; }
   virtual void OnCellChange(int oldCol, int newCol, int oldRow, int newRow) {}
@@ -262,6 +293,11 @@ class CGridCtrl : public QAbstractScrollArea {
   void LeaveHover();
   void MoveCurrentBy(int dCol, int dRow, Qt::KeyboardModifiers mods);
   void PositionEditor();
+  // False when the rows may not go (nothing was dragged).
+  bool StartDragOut();
+  // Moves `rows` before `to` when that changes anything and the grid agrees.
+  void MoveRowsTo(std::vector<int> rows, int to);
+  int RowInsertionAt(const QPoint& pt) const;
 
   // shape
   std::vector<int> m_colWidths;
@@ -302,6 +338,11 @@ class CGridCtrl : public QAbstractScrollArea {
   CGridCellType* m_hoverType = nullptr;
   Qt::CursorShape m_cursor = Qt::ArrowCursor;
   bool m_colSizing = true, m_colMoving = false, m_rowMoving = false;
+  // drag-out
+  bool m_dragOut = false;
+  bool m_dragOutRunning = false;
+  std::vector<int> m_outRows;  // the rows of the running drag
+  QByteArray m_outToken;       // marks this grid's own drag
   CGridDropListType* m_openDrop = nullptr;
   // editing
   QPointer<QLineEdit> m_editor;

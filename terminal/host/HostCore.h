@@ -6,6 +6,7 @@
 #include <string>
 
 #include "terminal/host/HostRuntime.h"
+#include "terminal/host/InstrumentNotices.h"
 #include "terminal/host/MarketSource.h"
 #include "terminal/host/RecordingSource.h"
 #include "terminal/host/ReplaySource.h"
@@ -50,6 +51,7 @@ struct HostCore {
   ViewDirectory views;
   std::unique_ptr<UserData> user;
   std::unique_ptr<SubscriptionBook> subscriptions;
+  std::unique_ptr<InstrumentNotices> instrumentNotices;  // 414 to the leading price view
   RequestTable requests;
 
   bool relaying300 = false;

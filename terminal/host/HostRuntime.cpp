@@ -106,6 +106,8 @@ HostRuntime::HostRuntime(const HostOptions& options, IHostShell* shell, IHostSto
     d->source = d->recorder.get();
   }
   d->subscriptions = std::make_unique<SubscriptionBook>(*d->source, d->views, *d->log, d->stats);
+  d->instrumentNotices = std::make_unique<InstrumentNotices>(*d->source, d->views);
+  d->subscriptions->SetChangeObserver([n = d->instrumentNotices.get()](const auto& changed) { n->Note(changed); });
   RegisterAllRequests(d->requests);
   d->language = std::make_unique<LanguageTable>();
   std::string imageDir = options.imageDir;
@@ -218,6 +220,7 @@ void HostRuntime::Pump(std::uint32_t now) {
     d->shell->ShowNotice(d->options.appTitle, hv::Widen("Recording stopped: " + d->recorder->Writer().Error()));
   }
   d->subscriptions->Pump(d->views.Of(nullptr));
+  d->instrumentNotices->Deliver();
   // Alerts: crossings were caught while the market moved; notices and saves now.
   d->CheckAlerts();
 }

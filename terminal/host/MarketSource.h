@@ -30,8 +30,11 @@ struct SessionInfo {
 
 class MarketSource {
  public:
-  // What changed about an instrument (the simulator's bits, same values).
-  enum ChangeBits : std::uint32_t { kBookChanged = 1, kTradeChanged = 2, kAllChanged = 3 };
+  // What changed about an instrument (the simulator's bits, same values):
+  // its book, its trades, its name ("INSTRNAME"), its remark ("REMARKS").
+  enum ChangeBits : std::uint32_t {
+    kBookChanged = 1, kTradeChanged = 2, kMarketChanged = 3, kNameChanged = 4, kRemarksChanged = 8
+  };
 
   virtual ~MarketSource() = default;
 

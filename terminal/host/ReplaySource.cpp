@@ -112,9 +112,15 @@ void ReplaySource::PlayTo(std::uint64_t target) {
     } else {
       values_.At(i, field, pending_.param, pending_.kind) = std::move(pending_.value);
     }
+    // A recorded name or remark is a change of that kind too (the host tells the price view).
+    std::uint32_t bits = kMarketChanged;
+    if (!pending_.depth && pending_.kind == 0) {
+      if (pending_.field == "INSTRNAME") bits |= kNameChanged;
+      else if (pending_.field == "REMARKS") bits |= kRemarksChanged;
+    }
     hasPending_ = false;
     if (!dirty_[std::size_t(i)]) dirtyList_.push_back(i);
-    dirty_[std::size_t(i)] = kAllChanged;
+    dirty_[std::size_t(i)] |= std::uint8_t(bits);
   }
   elapsed_ = std::max(elapsed_, target);
 }

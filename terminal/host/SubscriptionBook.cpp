@@ -32,8 +32,9 @@ std::uint32_t SubscriptionBook::DependsOn(const std::string& f, std::int32_t kin
   if (f == "BID" || f == "ASK" || f == "BVOL" || f == "SVOL" || f == "BUY" || f == "SELL" || f == "ORDS_BVOL" ||
       f == "ORDS_SVOL")
     return M::kBookChanged;
-  if (f == "CLOSE" || f == "REMARKS" || f == "CFD_STATUS" || f == "DMA_STATUS" || f == "MONTH" || f == "YEAR" ||
-      f == "INSTRNAME")
+  if (f == "REMARKS") return M::kRemarksChanged;
+  if (f == "INSTRNAME") return M::kNameChanged;
+  if (f == "CLOSE" || f == "CFD_STATUS" || f == "DMA_STATUS" || f == "MONTH" || f == "YEAR")
     return 0;  // fixed for the session
   return M::kTradeChanged;
 }
@@ -214,6 +215,7 @@ void SubscriptionBook::AnswerFetches() {
 
 void SubscriptionBook::CollectPushes(Answers& out) {
   const auto changed = market_.TakeChangedWithBits();
+  if (observer_) observer_(changed);
   for (const auto& [idx, bits] : changed) {
     auto it = byInstrument_.find(idx);
     if (it == byInstrument_.end()) continue;

@@ -39,6 +39,10 @@ class SubscriptionBook {
   std::size_t Count() const { return index_.size(); }
   // Called just before each 410 reaches its view (measurements); may be empty.
   void SetPushObserver(std::function<void(CSuperBaseView*)> observer) { onPush_ = std::move(observer); }
+  // Called in Pump with every change the market reported, before the pushes
+  // (the changes of names and remarks go to the leading price view as 414).
+  using ChangeObserver = std::function<void(const std::vector<std::pair<int, std::uint32_t>>&)>;
+  void SetChangeObserver(ChangeObserver observer) { observer_ = std::move(observer); }
   // The market indexes of the instruments with a quote subscription (kind 0,
   // param 0) of any view, each once, in subscription order.
   std::vector<int> QuoteInstruments() const;
@@ -89,6 +93,7 @@ class SubscriptionBook {
   std::vector<Fetch> fetches_;
   std::function<void(CSuperBaseView*)> onPush_;
   std::set<std::pair<std::int64_t, std::string>> unknownLogged_;
+  ChangeObserver observer_;
 };
 
 }  // namespace term

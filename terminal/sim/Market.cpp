@@ -358,6 +358,19 @@ struct Market::Impl {
   void Event(int i, Rng& r);
   void StepOnce();
 
+  // Name and remark changes, from their own stream.
+  Rng eventRng{0};
+  std::unordered_map<int, std::string> names;  // current names that differ from the reference records
+  std::unordered_set<std::string> takenNames;  // every name in use; made on the first rename
+  int corporateEvents = 0;
+  const std::string& CurrentName(int i) const {
+    auto it = names.find(i);
+    return it == names.end() ? instruments[std::size_t(i)].instrumentName : it->second;
+  }
+  void CorporateEvent();
+  void Rename(int b);
+  void ChangeRemark(int b);
+
   // The order book. An instrument someone watches keeps a book of its own
   // from the moment interest first arrives (so the same interest changes give
   // the same market); the others keep only their best prices and sizes, and
@@ -942,6 +955,59 @@ void Market::Impl::StepOnce() {
     const int i = bases[rng.Next() % bases.size()];
     if (rng.Uniform() * maxActivity < info[i].activity) Event(i, rng);
   }
+  if (config.corporateEventEveryMs > 0 && eventRng.Chance(double(kStepMs) / double(config.corporateEventEveryMs)))
+    CorporateEvent();
+}
+
+void Market::Impl::CorporateEvent() {
+  // Half the time a company someone watches, so that a user gets to see one.
+  std::vector<int> watched;
+  for (int i : hot)
+    if (info[std::size_t(i)].equity) watched.push_back(i);
+  int b = -1;
+  if (!watched.empty() && eventRng.Chance(0.5)) {
+    b = watched[eventRng.Next() % watched.size()];
+  } else {
+    for (int tries = 0; tries < 64 && b < 0; ++tries) {
+      const int i = bases[eventRng.Next() % bases.size()];
+      if (info[std::size_t(i)].equity) b = i;
+    }
+  }
+  if (b < 0) return;
+  ++corporateEvents;
+  if (eventRng.Chance(0.4)) Rename(b);
+  else ChangeRemark(b);
+}
+
+void Market::Impl::Rename(int b) {
+  if (takenNames.empty())
+    for (const JInstrumentUnderlying& rec : instruments) takenNames.insert(rec.instrumentName);
+  const SectorDef* sector = &kSectors[0];
+  for (const SectorDef& sd : kSectors)
+    if (instruments[std::size_t(b)].sector == sd.code) sector = &sd;
+  const std::string stem = std::string(kSyllA[eventRng.Range(0, int(std::size(kSyllA)) - 1)]) +
+                           kSyllB[eventRng.Range(0, int(std::size(kSyllB)) - 1)];
+  // An old name stays taken: no company takes another's former name the same day.
+  const std::string name = UniqueName(stem + " " + sector->words[eventRng.Range(0, 2)],
+                                      instruments[std::size_t(b)].instrumentCode, takenNames);
+  names[b] = name;
+  // The twins keep what sets them apart (" CFD", " (Brantic)").
+  const std::string& ref = instruments[std::size_t(b)].instrumentName;
+  if (auto it = aliasesOf.find(b); it != aliasesOf.end()) {
+    for (int a : it->second) {
+      const std::string& own = instruments[std::size_t(a)].instrumentName;
+      names[a] = name + (own.compare(0, ref.size(), ref) == 0 ? own.substr(ref.size()) : std::string());
+    }
+  }
+  MarkDirty(b, kNameChanged);
+}
+
+void Market::Impl::ChangeRemark(int b) {
+  State& s = state[std::size_t(b)];
+  int remark = s.remark;
+  while (remark == s.remark) remark = eventRng.Range(0, int(std::size(kRemarks)) - 1);
+  s.remark = std::int8_t(remark);
+  MarkDirty(b, kRemarksChanged);
 }
 
 // ---------------------------------------------------------------------------
@@ -950,6 +1016,7 @@ Market::Market(const MarketConfig& config) : d(std::make_unique<Impl>()) {
   d->config = config;
   d->now = config.startTick;
   d->rng = Rng(StreamSeed(config.seed, 1, 0x57E9));
+  d->eventRng = Rng(StreamSeed(config.seed, 2, 0xC0E7));
   int y = 2026; unsigned m = 12, dd = 7;
   if (std::sscanf(config.sessionDate.c_str(), "%d-%u-%u", &y, &m, &dd) != 3 || m < 1 || m > 12 || dd < 1 || dd > 31) {
     y = 2026; m = 12; dd = 7;
@@ -1045,6 +1112,13 @@ std::string Market::DateText() const {
 }
 std::string Market::TimeText() const { return Clock(d->TimeOfDay()); }
 std::uint32_t Market::TimeOfDayMs() const { return d->TimeOfDay(); }
+
+const std::string& Market::NameOf(int index) const {
+  static const std::string none;
+  if (index < 0 || index >= int(d->instruments.size())) return none;
+  return d->CurrentName(index);
+}
+int Market::CorporateEvents() const { return d->corporateEvents; }
 
 int Market::BaseOf(int index) const {
   if (index < 0 || index >= int(d->instruments.size())) return -1;
@@ -1290,7 +1364,7 @@ std::string Market::FieldValue(int index, std::string_view f, int param, int kin
     if (f == "BVOL") return std::to_string(s.bidVol);
     if (f == "SVOL") return std::to_string(s.askVol);
     if (f == "VOL") return std::to_string(s.volume);
-    if (f == "INSTRNAME") return d->instruments[index].instrumentName;
+    if (f == "INSTRNAME") return d->CurrentName(index);
     if (f == "REMARKS" || f == "CFD_STATUS" || f == "DMA_STATUS" || f == "MONTH" || f == "YEAR") {
       const Quote q = QuoteOf(index);
       if (f == "REMARKS") return q.remarks;

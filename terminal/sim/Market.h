@@ -11,6 +11,11 @@
 // fixed steps of `kStepMs`, so the same seed and the same sequence of ticks
 // (and of interest changes) give the same market.
 //
+// Now and then (about once a minute of market time, from a stream of its own,
+// so the prices are the same with or without) a company changes its name or
+// its exchange remark: half the time one that someone watches. The reference
+// records stay as they were; "INSTRNAME" and "REMARKS" give the current texts.
+//
 // Plain C++, no Qt, single-threaded.
 #include <cstdint>
 #include <functional>
@@ -34,6 +39,8 @@ struct MarketConfig {
   std::string sessionDate = "2026-12-07";
   int sessionStartSeconds = 10 * 3600 + 30 * 60;  // time of day at `startTick`
   std::uint32_t startTick = 0;
+  // Mean market time between name or remark changes; 0: none.
+  std::uint32_t corporateEventEveryMs = 60000;
 };
 
 // One trade of the tape. Trade numbers start at 1 and are the position + 1.
@@ -142,7 +149,9 @@ class Market {
 
   // What changed about an instrument: its book (bid, ask, sizes, levels) or
   // its trades (last, day figures, tape, summary; a trade moves the book too).
-  enum ChangeBits : std::uint32_t { kBookChanged = 1, kTradeChanged = 2 };
+  // A name change moves "INSTRNAME", a remark change "REMARKS" (of the
+  // instrument and of the twins that share its market).
+  enum ChangeBits : std::uint32_t { kBookChanged = 1, kTradeChanged = 2, kNameChanged = 4, kRemarksChanged = 8 };
   // Instruments whose values changed since the last call, sorted, each once.
   std::vector<int> TakeChanged();
   // The same with what changed about each.
@@ -167,6 +176,11 @@ class Market {
   std::vector<DepthLevel> Book(int index, int levels);
   const std::vector<Trade>& Trades(int index);
   std::vector<SummaryLine> Summary(int index);  // by price, highest first
+
+  // The current name of an instrument (the reference record's until it changed).
+  const std::string& NameOf(int index) const;
+  // Name and remark changes so far.
+  int CorporateEvents() const;
 
   // The value text of a field as the views receive it (410/412), "" when none.
   // kind 0: quote fields (and depth fields at level 1); kind 1: depth fields at

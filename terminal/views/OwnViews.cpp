@@ -424,10 +424,11 @@ void CExplorerView::search(const QString& text) {
   constexpr int kLimit = 500;
   const QString needle = text.trimmed();
   int matches = 0;
-  for (const auto& ins : m->Instruments()) {
+  for (int index = 0; index < int(m->Instruments().size()); ++index) {
+    const auto& ins = m->Instruments()[std::size_t(index)];
     const QString code = QString::fromStdString(ins.instrumentCode);
     const QString display = QString::fromStdString(ins.displayCode);
-    const QString name = QString::fromStdString(ins.instrumentName);
+    const QString name = QString::fromStdString(m->NameOf(index));  // the current name, renames included
     const QString symbol = QString::fromStdString(ins.symbol);
     if (!needle.isEmpty() && !code.contains(needle, Qt::CaseInsensitive) &&
         !display.contains(needle, Qt::CaseInsensitive) && !symbol.contains(needle, Qt::CaseInsensitive) &&
@@ -526,7 +527,7 @@ void CAnalyticsView::Refresh() {
   auto pct = [](double v) { return QString::number(v, 'f', 2) + "%"; };
   std::vector<std::pair<QString, QString>> rows = {
       {"Instrument", QString::fromStdString(ins->displayCode.empty() ? ins->instrumentCode : ins->displayCode)},
-      {"Name", QString::fromStdString(ins->instrumentName)},
+      {"Name", QString::fromStdString(m->NameOf(m_instrument))},
       {"Exchange", QString::fromStdString(ins->exchangeCode)},
       {"Product type", CExplorerView::TypeName(ins->productType)},
       {"Sector", SectorName(*m, ins->sector)},
@@ -585,7 +586,7 @@ void CNewsView::InstrumentChanged() {
   }
   sim::Market* m = MarketOrNull();
   const auto& q = m->QuoteOf(m_instrument);
-  const QString name = QString::fromStdString(ins->instrumentName);
+  const QString name = QString::fromStdString(m->NameOf(m_instrument));
   Add(QString::fromStdString(m->TimeText()),
       QString("%1 (%2%3): previous close %4, opened at %5")
           .arg(name, QString::fromStdString(ins->exchangeCode),
@@ -603,7 +604,7 @@ void CNewsView::Refresh() {
   sim::Market* m = MarketOrNull();
   const auto& q = m->QuoteOf(m_instrument);
   const QString time = QString::fromStdString(m->TimeText());
-  const QString name = QString::fromStdString(ins->instrumentName);
+  const QString name = QString::fromStdString(m->NameOf(m_instrument));
   if (q.last > 0 && q.close > 0) {
     const double pchange = (q.last - q.close) / q.close * 100;
     // A headline for every further full percent of move.

@@ -196,7 +196,7 @@ QString CTerminalView::InstrumentLabel() const {
   if (!Runtime() || m_instrument < 0) return {};
   const auto& ins = Runtime()->Market().Instruments()[static_cast<std::size_t>(m_instrument)];
   return QString::fromStdString(ins.displayCode.empty() ? ins.instrumentCode : ins.displayCode) + " " +
-         QString::fromStdString(ins.instrumentName);
+         QString::fromStdString(Runtime()->Market().NameOf(m_instrument));
 }
 
 void CTerminalView::SendTitle() {

@@ -1,5 +1,6 @@
 #include "views/price/PriceGrid.h"
 
+#include <QMimeData>
 #include <QPaintEvent>
 #include <QHash>
 #include <QPainter>
@@ -11,8 +12,10 @@
 #include "addon/LinkText.h"
 #include "addon/RegisteredMessages.h"
 #include "addon/TextTables.h"
+#include "addon/ViewClasses.h"
 #include "data/MarketDelayCache.h"
 #include "data/ReferenceStores.h"
+#include "hostview/DragData.h"
 #include "hostview/HostLists.h"
 #include "hostview/MessageIds.h"
 #include "hostview/NumberText.h"
@@ -250,6 +253,7 @@ PriceGrid::PriceGrid(QWidget* parent)
   SetHighlightSelection(false);
   EnableColumnMove(true);
   EnableRowMove(false);
+  EnableDragOut(true);
   m_palette.evenRow = ColorFromRef(kDefaultEvenRow);
   m_palette.oddRow = ColorFromRef(kDefaultOddRow);
   m_palette.selBack = ColorFromRef(kDefaultSelRow);
@@ -1066,7 +1070,16 @@ bool PriceGrid::OnCanMoveRows(const std::vector<int>&, int) {
   return m_listKind == kUserWatchlists || m_listKind == kKeldoWatchlists;
 }
 
-void PriceGrid::OnRowsMoved(const std::vector<int>& rows, int to) {
+void PriceGrid::OnRowsMoved(const std::vector<int>& movedRows, int to) {
+  std::vector<int> rows = movedRows;
+  if (!m_dragKeys.empty()) {
+    // Dropped back: the dragged instruments where they are now (the sort may have run meanwhile).
+    rows.clear();
+    for (int r = 0; r < int(m_rows.size()); ++r)
+      if (std::find(m_dragKeys.begin(), m_dragKeys.end(), m_rows[std::size_t(r)].key) != m_dragKeys.end())
+        rows.push_back(r);
+    if (rows.empty()) return;
+  }
   std::vector<std::size_t> order(m_rows.size());
   std::iota(order.begin(), order.end(), std::size_t(0));
   CGridCtrl::ApplyRowMove(order, rows, to);
@@ -1077,3 +1090,31 @@ void PriceGrid::OnRowsMoved(const std::vector<int>& rows, int to) {
   SendToOwner(addon::Msg().wlMoveIns, 0, 0);
   RedrawAll();
 }
+
+// ---- Dragging rows out ----------------------------------------------------------------------------
+
+bool PriceGrid::OnDragOutData(const std::vector<int>& rows, QMimeData& mime) {
+  // World indices open nothing elsewhere (no link, no view commands): they stay.
+  if (m_listKind == kWorldIndices) return false;
+  std::vector<InstrumentKey> keys;
+  addon::LinkTextBuilder link{std::string_view(addon::kPriceViewSource)};
+  for (int r : rows) {
+    if (r < 0 || r >= int(m_rows.size())) continue;
+    const Row& row = m_rows[std::size_t(r)];
+    if (!keys.empty()) link.NextObject();
+    link.AddInt64(addon::linkkey::kProductId, row.key.ProductID)
+        .Add(addon::linkkey::kInstrumentCode, std::wstring_view(row.key.InstrumentCode))
+        .Add(addon::linkkey::kExchangeCode, std::string_view(row.exchangeCode));
+    keys.push_back(row.key);
+  }
+  if (keys.empty()) return false;
+  if (!platform::SendMessage(Owner(), addon::Msg().wlStartDrag, ToLParam(&keys), 0)) return false;
+  m_dragKeys = keys;
+  const QByteArray text = QByteArray::fromStdString(link.Narrow());
+  mime.setData(hv::drag::kLinkMimeType, text);
+  mime.setData(hv::drag::kSourceMimeType, QByteArray(addon::kPriceViewSource));
+  mime.setText(QString::fromUtf8(text));
+  return true;
+}
+
+void PriceGrid::OnDragOutDone(Qt::DropAction) { m_dragKeys.clear(); }

@@ -19,6 +19,12 @@
 //   MSG_KELDOWLREMOVEINSLIST (sent)   wParam = const std::vector<InstrumentKey>*
 //                                 (the selected rows), lParam = watchlist position;
 //   MSG_WLMOVEINS (sent)          rows were moved by dragging (user and brand lists).
+//   MSG_WLSTARTDRAG (sent)        rows are being dragged out: wParam = const
+//                                 std::vector<InstrumentKey>* (the dragged rows);
+//                                 a zero answer refuses the drag. The drag carries
+//                                 the JSON link text (one object per row: product
+//                                 id, instrument code, exchange code) and the
+//                                 source name "price view" (hostview/DragData.h).
 // UI thread only.
 #include <QColor>
 #include <QFont>
@@ -166,6 +172,8 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   void OnColMoved(int from, int to) override;
   bool OnCanMoveRows(const std::vector<int>& rows, int to) override;
   void OnRowsMoved(const std::vector<int>& rows, int to) override;
+  bool OnDragOutData(const std::vector<int>& rows, QMimeData& mime) override;
+  void OnDragOutDone(Qt::DropAction action) override;
   bool OnKeyDown(int key, Qt::KeyboardModifiers mods) override;
   void paintEvent(QPaintEvent* e) override;
 
@@ -211,6 +219,8 @@ class PriceGrid : public CGridCtrl, public IQuoteGrid {
   std::uint64_t m_updates = 0;
   std::vector<Column> m_columns;
   int m_sortCol = -1;
+  // The instruments of the drag that runs: a re-sort while it runs moves their rows.
+  std::vector<InstrumentKey> m_dragKeys;
   int m_sortFlag = 0;
   int m_pressedHeading = -2;
   bool m_columnMoved = false;

@@ -74,7 +74,7 @@ std::wstring Lang(int id, const wchar_t* fallback) {
 }
 
 // A field update of the leading price view's instrument records.
-constexpr UINT kInstrumentFieldUpdate = 414;
+constexpr UINT kInstrumentFieldUpdate = hm::InstrumentFieldUpdate;
 
 // Process-wide: how often a silent instrument was asked again.
 std::map<InstrumentKey, int>& RetryCounters() {
@@ -1248,8 +1248,10 @@ LRESULT CPriceViewAdv::OnWindowMessage(UINT message, WPARAM wParam, LPARAM lPara
     return 0;
   }
   if (message == msg.wlStartDrag) {
-    SetDragDrop(L"price view");
-    return 0;
+    // The grid drags its rows out under this view's source name; nonzero lets it.
+    if (!EnableDragOut() || !keys || keys->empty()) return 0;
+    SetDragDrop(hv::Widen(addon::kPriceViewSource));
+    return 1;
   }
   if (message == msg.pvColumnUpdate) return 0;
   return 0;

@@ -11,6 +11,7 @@
 #include <QFile>
 #include <QFileInfo>
 #include <QMap>
+#include <QSet>
 #include <QStringList>
 #include <QTemporaryDir>
 
@@ -98,6 +99,42 @@ TEST(PriceTerminal, HeadlessDumpShowsTheMarketsQuotesWithTheInstrumentsDecimals)
     const QString text = QString::fromUtf8(f.readAll()).toLower();
     EXPECT_FALSE(text.contains("nan") || text.contains("inf")) << file.toStdString();
   }
+}
+
+// Ten minutes of the simulated market rename a few companies; the ones the
+// price view shows carry their new names in the grid (told by the terminal as
+// 414 to the leading price view).
+TEST(PriceTerminal, RenamedCompaniesShowTheirNewNamesInTheGrid) {
+  QTemporaryDir data, dump;
+  ASSERT_TRUE(data.isValid() && dump.isValid());
+  const RunResult run = RunTerminal({"--headless", "--seconds", "600", "--no-restore", "--data-dir", data.path(),
+                                     "--dump", dump.path(), "--open", "CPriceViewAdv"});
+  ASSERT_EQ(run.exitCode, 0) << run.err.toStdString();
+  const RunResult list = RunTerminal({"--list-instruments"});
+  ASSERT_EQ(list.exitCode, 0);
+  QMap<QString, QString> nameOf;  // "code\texchange" of the shares (product 101) -> reference name
+  QSet<QString> referenceNames;
+  for (const QString& line : list.out.split('\n', Qt::SkipEmptyParts)) {
+    const QStringList f = line.split('\t');
+    if (f.size() < 4) continue;
+    referenceNames.insert(f[3].trimmed());
+    if (f[0] == "101") nameOf[f[1] + "\t" + f[2].trimmed()] = f[3].trimmed();
+  }
+  const auto grid = ReadTsv(QDir(dump.path()).filePath("CPriceViewAdv-1.tsv"));
+  ASSERT_GE(grid.size(), 6u);
+  const int symbol = grid[0].indexOf("Symbol"), name = grid[0].indexOf("Name"), exchange = grid[0].indexOf("Exchange");
+  ASSERT_TRUE(symbol >= 0 && name >= 0 && exchange >= 0);
+  int renamed = 0;
+  for (std::size_t i = 1; i < grid.size(); ++i) {
+    const QStringList& g = grid[i];
+    const QString key = g.value(symbol) + "\t" + g.value(exchange);
+    ASSERT_TRUE(nameOf.contains(key)) << key.toStdString();
+    if (g.value(name) == nameOf[key]) continue;
+    ++renamed;
+    EXPECT_FALSE(g.value(name).isEmpty());
+    EXPECT_FALSE(referenceNames.contains(g.value(name))) << "a new name: " << g.value(name).toStdString();
+  }
+  EXPECT_GE(renamed, 1) << "ten minutes of this market rename a shown company";
 }
 
 }  // namespace

@@ -253,3 +253,45 @@ TEST(RecordReplay, ARecordingDamagedAfterItsCheckStopsTheReplayWithANotice) {
   ASSERT_NE(runtime.Replay(), nullptr);
   EXPECT_NE(runtime.Replay()->Problem().find("the kind \"9\""), std::string::npos) << runtime.Replay()->Problem();
 }
+
+namespace {
+
+// The 414s an activated price view receives over `minutes` of market time.
+std::vector<std::string> PlayRenames(const term::HostOptions& options, int minutes) {
+  EnsureApp();
+  RecordingShell shell;
+  term::MemoryHostStore store;
+  std::vector<std::string> seen;
+  term::HostRuntime runtime(options, &shell, &store);
+  shell.runtime = &runtime;
+  RecordingView price("CPriceViewAdv");
+  price.onNote = [&seen](const RecordingView::Note& n) {
+    if (n.msg == hm::InstrumentFieldUpdate)
+      seen.push_back(n.update.instrumentCode + "|" + n.update.fieldName + "|" + n.update.value);
+  };
+  runtime.AttachView(&price);
+  runtime.Activate(&price);
+  std::uint32_t now = platform::UseVirtualClock().Now();
+  for (int s = 0; s < minutes * 60; ++s) runtime.Pump(now += 1000);
+  runtime.DestroyView(&price);
+  return seen;
+}
+
+}  // namespace
+
+TEST(RecordReplay, RenamesAreRecordedAndToldAgainInTheReplay) {
+  TempDir dir;
+  term::HostOptions recordOptions = Options();
+  recordOptions.record = std::make_shared<term::rec::Writer>();
+  std::string error;
+  ASSERT_TRUE(recordOptions.record->Open(dir.File("renames.mvrec"), error)) << error;
+  const std::vector<std::string> recorded = PlayRenames(recordOptions, 20);
+  ASSERT_TRUE(recordOptions.record->Finish(20 * 60 * 1000)) << recordOptions.record->Error();
+  ASSERT_GE(recorded.size(), 3u) << "twenty minutes of market bring a few renames";
+
+  auto summary = std::make_shared<term::rec::Summary>();
+  ASSERT_TRUE(term::rec::Scan(dir.File("renames.mvrec"), *summary, error)) << error;
+  term::HostOptions replayOptions = Options();
+  replayOptions.replay = summary;
+  EXPECT_EQ(PlayRenames(replayOptions, 20), recorded);
+}

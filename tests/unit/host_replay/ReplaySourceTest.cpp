@@ -40,7 +40,7 @@ struct Replay {
 std::vector<int> Changed(ReplaySource& s) {
   std::vector<int> out;
   for (const auto& [i, bits] : s.TakeChangedWithBits()) {
-    EXPECT_EQ(bits, term::MarketSource::kAllChanged);
+    EXPECT_EQ(bits, term::MarketSource::kMarketChanged);
     out.push_back(i);
   }
   return out;

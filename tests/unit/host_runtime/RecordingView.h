@@ -60,7 +60,9 @@ class RecordingView : public CSuperBaseView {
     n.msg = msg;
     n.word = data;
     switch (msg) {
-      case hm::FieldValue: case hm::RequestField: n.update = *FromLParam<FieldUpdate>(data); break;
+      case hm::FieldValue: case hm::RequestField: case hm::InstrumentFieldUpdate:
+        n.update = *FromLParam<FieldUpdate>(data);
+        break;
       case hm::TextByKey: case hm::MessageText: case hm::LinkedInstrument: n.wtext = *FromLParam<std::wstring>(data); break;
       case hm::SystemParameter: case hm::NoticeParameter: n.text = *FromLParam<std::string>(data); break;
       case hm::LinkData: {

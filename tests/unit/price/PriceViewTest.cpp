@@ -1,6 +1,8 @@
 // The price view through the scripted host: what it asks the terminal for,
 // how it shows and edits watchlists, and how it reacts to the user.
+#include <QDrag>
 #include <QKeyEvent>
+#include <QMimeData>
 #include <QLineEdit>
 
 #include "controls/InstrumentComboBox.h"
@@ -8,6 +10,7 @@
 #include "PriceFixture.h"
 #include "hostview/Buttons.h"
 #include "hostview/CustomTabCtrl.h"
+#include "hostview/DragData.h"
 #include "views/price/TipDialogs.h"
 
 namespace pricetest {
@@ -607,6 +610,116 @@ TEST_F(PriceView, Drops_AcceptedOnlyByUserAndBrandFamiliesFromOtherSources) {
   EXPECT_FALSE(view->EnableDropIn("CTradeView"));
   view->OnCommand(CPriceViewAdv::kKeldoButtonId);
   EXPECT_TRUE(view->EnableDropIn("CTradeView"));
+}
+
+// Drags rows of the price grid from `fromRow` far down, as a hand would; the
+// runner stands in for the drag and may drop it back on the grid at the top.
+struct GridDrag {
+  PriceGrid* grid;
+  bool dropBack = false;
+  bool taken = false;
+  std::function<void()> meanwhile;  // runs while the drag is on
+  std::vector<std::string> links, sources;
+  explicit GridDrag(PriceGrid* g) : grid(g) {
+    CGridCtrl::SetDragRunner([this](QDrag& d) {
+      links.push_back(d.mimeData()->data(hv::drag::kLinkMimeType).toStdString());
+      sources.push_back(d.mimeData()->data(hv::drag::kSourceMimeType).toStdString());
+      if (meanwhile) meanwhile();
+      if (!dropBack) return Qt::IgnoreAction;
+      taken = grid->HandleDrop(d.mimeData(), QPoint(grid->CellRect(0, 0).center().x(), grid->CellRect(0, 0).top() + 2));
+      return taken ? Qt::MoveAction : Qt::IgnoreAction;
+    });
+  }
+  ~GridDrag() { CGridCtrl::SetDragRunner(nullptr); }
+  void From(int row) {
+    const int col = grid->ColumnOf(pricecol::Col::Symbol);
+    const QPoint from = grid->CellRect(col, row).center();
+    auto send = [&](QEvent::Type type, QPoint at, Qt::MouseButton button, Qt::MouseButtons buttons) {
+      const QPointF p(at);
+      QMouseEvent e(type, p, grid->viewport()->mapToGlobal(p), button, buttons, Qt::NoModifier);
+      QApplication::sendEvent(grid->viewport(), &e);
+    };
+    send(QEvent::MouseButtonPress, from, Qt::LeftButton, Qt::LeftButton);
+    for (int dy = 4; dy <= 40; dy += 4) send(QEvent::MouseMove, from + QPoint(0, dy), Qt::NoButton, Qt::LeftButton);
+    send(QEvent::MouseButtonRelease, from + QPoint(0, 40), Qt::LeftButton, Qt::NoButton);
+  }
+};
+
+TEST_F(PriceView, DragOut_SelectedRowsTravelAsPriceViewLinksAndMoveOnlyInsideTheirWatchlist) {
+  CPriceViewAdv* view = Make();
+  DecodeSaves(host);
+  PriceGrid* grid = view->GetPriceGrid();
+  GridDrag drag(grid);
+  // Banks: D05, O39, U11. The two selected rows go, in order, named "price view".
+  grid->SelectRow(1);
+  grid->SelectRow(2, true);
+  host.ClearRequests();
+  drag.From(2);
+  ASSERT_EQ(drag.links.size(), 1u);
+  EXPECT_EQ(drag.links[0],
+            "{\"type\":\"price view\",\"data\":[{\"Field_product_id\":\"1\",\"Field_instrument_code\":\"O39\","
+            "\"Field_exchange_code\":\"SGX\"},{\"Field_product_id\":\"1\",\"Field_instrument_code\":\"U11\","
+            "\"Field_exchange_code\":\"SGX\"}]}");
+  EXPECT_EQ(drag.sources[0], "price view");
+  EXPECT_TRUE(host.Requests().empty()) << "dragging alone changes nothing";
+  // Dropped on a price view (this one or another): refused, nothing added or saved.
+  EXPECT_FALSE(view->EnableDropIn(drag.sources[0].c_str()));
+  const std::wstring link = hv::Widen(drag.links[0]);
+  ViewLink drop;
+  drop.className = hv::Widen(drag.sources[0]);
+  drop.link = &link;
+  view->ShowWatchlist(kUserWatchlists, L"Empty");
+  host.ClearRequests();
+  view->DoDragDrop(hm::LinkData, ToLParam(&drop));
+  EXPECT_TRUE(Codes(grid).empty());
+  EXPECT_TRUE(host.Requests().empty());
+  EXPECT_TRUE(Boxes().empty());
+
+  // Dropped back on its own grid: the rows move to the top and the order is saved (612).
+  view->ShowWatchlist(kUserWatchlists, L"Banks");
+  grid->SelectRow(1);
+  grid->SelectRow(2, true);
+  drag.dropBack = true;
+  host.ClearRequests();
+  drag.From(1);
+  EXPECT_TRUE(drag.taken);
+  EXPECT_EQ(Codes(grid), (std::vector<std::wstring>{L"O39", L"U11", L"D05"}));
+  EXPECT_EQ(UserWatchlistStore().FindPtr(L"Banks")->items,
+            (std::vector<InstrumentKey>{{1, L"O39"}, {1, L"U11"}, {1, L"D05"}}));
+  ASSERT_EQ(host.RequestsOf(hm::SaveUserWatchlist).size(), 1u);
+  const WatchlistFeedback saved = FeedbackOf(host.RequestsOf(hm::SaveUserWatchlist)[0]);
+  EXPECT_EQ(saved.WatchlistID, 11);
+  EXPECT_LT(saved.text.find(L"\"O39\""), saved.text.find(L"\"D05\""));
+
+  // Sorted while the drag is on: the dragged instruments move, wherever the sort put them.
+  grid->ClearSelection();
+  grid->SelectRow(2);  // D05
+  drag.meanwhile = [&] {
+    grid->SortOnColumn(grid->ColumnOf(pricecol::Col::Symbol));  // D05, O39, U11
+  };
+  drag.From(2);
+  drag.meanwhile = nullptr;
+  EXPECT_EQ(Codes(grid), (std::vector<std::wstring>{L"D05", L"O39", L"U11"}));
+  EXPECT_EQ(UserWatchlistStore().FindPtr(L"Banks")->items,
+            (std::vector<InstrumentKey>{{1, L"D05"}, {1, L"O39"}, {1, L"U11"}}));
+
+  // A TOP30 list drags out too, but its order is not the user's to change.
+  view->OnCommand(CPriceViewAdv::kTop30ButtonId);
+  const std::vector<std::wstring> top30 = Codes(grid);
+  ASSERT_EQ(top30.size(), 2u);
+  grid->SelectRow(1);
+  host.ClearRequests();
+  drag.From(1);
+  EXPECT_EQ(drag.links.size(), 4u);
+  EXPECT_FALSE(drag.taken);
+  EXPECT_EQ(Codes(grid), top30);
+  EXPECT_TRUE(host.RequestsOf(hm::SaveUserWatchlist).empty());
+
+  // World indices stay where they are.
+  view->OnCommand(CPriceViewAdv::kWorldButtonId);
+  ASSERT_EQ(grid->Rows().size(), 2u);
+  drag.From(0);
+  EXPECT_EQ(drag.links.size(), 4u);
 }
 
 TEST_F(PriceView, Shortcuts_BuyAndSellTheSelectedRowWithItsPriceWhenAboveZero) {

@@ -1,6 +1,8 @@
 #include <gtest/gtest.h>
 
+#include <QDrag>
 #include <QHelpEvent>
+#include <QMimeData>
 #include <QLineEdit>
 #include <QTest>
 #include <map>
@@ -515,6 +517,91 @@ TEST_F(GridTest, Grid_DumpKeepsOneLinePerRowWhateverTheCellsHold) {
   CGridCell cell;
   g.GetCell(0, 0, cell);
   EXPECT_EQ(cell.text, QStringLiteral("a\tb\tc")) << "the cell itself keeps its text";
+}
+
+// A grid whose rows can be dragged out; a runner stands in for the drag.
+class DragOutGrid : public RecordingGrid {
+ public:
+  using RecordingGrid::RecordingGrid;
+  bool refuse = false;
+  std::vector<int> dragged;
+  std::vector<Qt::DropAction> done;
+  bool OnDragOutData(const std::vector<int>& rows, QMimeData& mime) override {
+    dragged = rows;
+    if (refuse) return false;
+    QByteArray text;
+    for (int r : rows) text += QByteArray::number(order[std::size_t(r)]) + ";";
+    mime.setData("text/x-test-rows", text);
+    return true;
+  }
+  void OnDragOutDone(Qt::DropAction action) override { done.push_back(action); }
+};
+
+struct DragRunnerScope {
+  explicit DragRunnerScope(CGridCtrl::DragRunner runner) { CGridCtrl::SetDragRunner(std::move(runner)); }
+  ~DragRunnerScope() { CGridCtrl::SetDragRunner(nullptr); }
+};
+
+TEST_F(GridTest, Grid_RowsDraggedOutCarryTheSelectionAndMoveOnlyWhenDroppedBackOnAMovableGrid) {
+  DragOutGrid g(3, 10);
+  g.SetSelectionMode(CGridCtrl::MultiSelection);
+  g.EnableDragOut(true);
+  g.show();
+  std::vector<QByteArray> payloads;
+  bool dropBack = false, taken = false;
+  QPoint dropAt;
+  DragRunnerScope scope([&](QDrag& d) {
+    payloads.push_back(d.mimeData()->data("text/x-test-rows"));
+    EXPECT_FALSE(d.mimeData()->data(CGridCtrl::kOwnRowsMimeType).isEmpty()) << "marked as the grid's own";
+    if (!dropBack) return Qt::IgnoreAction;
+    taken = g.HandleDrop(d.mimeData(), dropAt);
+    return taken ? Qt::MoveAction : Qt::IgnoreAction;
+  });
+  // Less than the start distance is a click, not a drag.
+  const QPoint row1 = CellCenter(g, 0, 1);
+  Drag(g, row1, row1 + QPoint(1, 0));
+  EXPECT_TRUE(payloads.empty());
+  // An unselected row goes alone; nothing moves when nothing takes it.
+  Drag(g, row1, CellCenter(g, 0, 6));
+  ASSERT_EQ(payloads.size(), 1u);
+  EXPECT_EQ(g.dragged, (std::vector<int>{1}));
+  EXPECT_EQ(payloads[0], "1;");
+  EXPECT_EQ(g.done, (std::vector<Qt::DropAction>{Qt::IgnoreAction}));
+  EXPECT_EQ(g.order, (std::vector<int>{0, 1, 2, 3, 4, 5, 6, 7, 8, 9}));
+  // The selected rows travel together in row order, whichever of them is pressed.
+  g.SelectRow(2);
+  g.SelectRow(4, true);
+  g.SelectRow(5, true);
+  Drag(g, CellCenter(g, 0, 4), CellCenter(g, 0, 8));
+  EXPECT_EQ(g.dragged, (std::vector<int>{2, 4, 5}));
+  EXPECT_EQ(payloads.back(), "2;4;5;");
+  EXPECT_TRUE(g.IsRowSelected(2) && g.IsRowSelected(4) && g.IsRowSelected(5)) << "the press kept the selection";
+
+  // Dropped back on a grid whose rows move: they move there and stay selected.
+  g.EnableRowMove(true);
+  dropBack = true;
+  dropAt = QPoint(CellCenter(g, 0, 0).x(), g.CellRect(0, 0).top() + 2);
+  Drag(g, CellCenter(g, 0, 4), CellCenter(g, 0, 8));
+  EXPECT_TRUE(taken);
+  EXPECT_EQ(g.order, (std::vector<int>{2, 4, 5, 0, 1, 3, 6, 7, 8, 9}));
+  EXPECT_EQ(g.done.back(), Qt::MoveAction);
+  EXPECT_TRUE(g.IsRowSelected(0) && g.IsRowSelected(1) && g.IsRowSelected(2));
+  // Without row moving, the grid refuses its own rows.
+  g.EnableRowMove(false);
+  Drag(g, CellCenter(g, 0, 0), CellCenter(g, 0, 8));
+  EXPECT_FALSE(taken);
+  EXPECT_EQ(g.order, (std::vector<int>{2, 4, 5, 0, 1, 3, 6, 7, 8, 9}));
+  // Another drag's data is never taken for a row move.
+  g.EnableRowMove(true);
+  QMimeData foreign;
+  foreign.setData(CGridCtrl::kOwnRowsMimeType, "someone-else");
+  EXPECT_FALSE(g.HandleDrop(&foreign, dropAt));
+  // A grid that refuses the rows starts no drag: the same gesture selects rows.
+  g.refuse = true;
+  const std::size_t before = payloads.size();
+  Drag(g, CellCenter(g, 0, 3), CellCenter(g, 0, 8));
+  EXPECT_EQ(payloads.size(), before);
+  EXPECT_EQ(g.GetSelectedRows(), (std::vector<int>{3, 4, 5, 6, 7, 8}));
 }
 
 }  // namespace

@@ -21,6 +21,7 @@ constexpr UINT WithdrawField = 401;       // V FieldRequest
 constexpr UINT FieldValue = 410;          // H FieldUpdate
 constexpr UINT RequestField = 412;        // V FieldRequest / H FieldUpdate
 constexpr UINT PriceViewRequest413 = 413; // V two int32
+constexpr UINT InstrumentFieldUpdate = 414;  // H FieldUpdate, to the leading price view: "INSTRNAME", "REMARKS"
 constexpr UINT InstrumentList = 500;      // V none / H JInstrumentListMsg
 constexpr UINT ExchangeList = 503;        // V none / H JExchangeListMsg
 constexpr UINT RemarkMessages = 504;      // V/H
