@@ -78,6 +78,17 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
     else if (arg == "--headless") o.headless = true;
     else if (arg == "-v" || arg == "--verbose") o.verbose = true;
     else if (arg == "--no-restore") o.restoreLayout = false;
+    else if (arg == "--real-time") o.realTime = true;
+    else if (arg == "--save-churn") o.saveChurn = true;
+    else if (arg == "--soak-report") {
+      if (!value(o.soakReport)) return false;
+      if (o.soakReport.empty()) { error = "--soak-report needs a file name"; return false; }
+    } else if (arg == "--latency-report") {
+      if (!value(o.latencyReport)) return false;
+      if (o.latencyReport.empty()) { error = "--latency-report needs a file name"; return false; }
+    } else if (arg == "--check-churn") {
+      if (!number(o.checkChurn, 0, std::numeric_limits<std::int64_t>::max())) return false;
+    }
     else if (arg == "--seconds") {
       std::string text;
       if (!value(text)) return false;
@@ -97,6 +108,15 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
       if (!number(o.instruments, 1, 500000)) return false;
     } else if (arg == "--rate") {
       if (!number(o.rate, 0, 10000000)) return false;
+    } else if (arg == "--pace") {
+      std::string text;
+      if (!value(text)) return false;
+      double x = 0;
+      if (!ParseNumber(text, x) || !(x >= 0.1) || !(x <= 100)) {
+        error = "--pace: expected a factor from 0.1 to 100 (1 is the market as it is), got \"" + text + "\"";
+        return false;
+      }
+      o.pace = x;
     } else if (arg == "--open") {
       std::string text;
       if (!value(text)) return false;
@@ -178,6 +198,23 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
     error = "--snapshot and --dump need --seconds N (or --headless)";
     return false;
   }
+  const bool timed = o.headless || o.seconds;
+  if (o.realTime && !timed) {
+    error = "--real-time is for a headless or --seconds run (a run with a window is always on the real clock)";
+    return false;
+  }
+  if (!o.soakReport.empty() && (!timed || o.realTime)) {
+    error = "--soak-report measures a run on the virtual clock: use it with --headless or --seconds N";
+    return false;
+  }
+  if (!o.latencyReport.empty() && timed && !o.realTime) {
+    error = "--latency-report needs the real clock: add --real-time to --headless or --seconds";
+    return false;
+  }
+  if (o.saveChurn && (!timed || o.realTime)) {
+    error = "--save-churn runs with --headless or --seconds N on the virtual clock";
+    return false;
+  }
   return true;
 }
 
@@ -208,7 +245,9 @@ Options:
                           and exit (without it, a headless run lasts 10 seconds)
   --seed N                seed of the simulated market (same seed, same market)
   --instruments N         number of simulated instruments (1 to 500000)
-  --rate N                simulated field updates per second
+  --rate N                the most simulated field updates per second
+  --pace X                the watched instruments trade and quote X times as often
+                          (0.1 to 100; 10 with --rate 40000: ten times the default feed)
   --style light|dark      the style of this session (the Display menu's choice is kept
                           for the next; this one is not)
   --record FILE           write the market the views receive (reference data and
@@ -218,6 +257,19 @@ Options:
   --trace-messages FILE   write every message the views receive (number and record,
                           as the fuzz harnesses read them) to FILE
   --speed X               replay speed, 0.1 to 1000 (default 1: as recorded)
+  --real-time             with --headless or --seconds: run on the real clock for N
+                          seconds of wall time instead of as fast as possible
+  --soak-report FILE      with --headless or --seconds: sample the memory in use
+                          (RSS) every simulated minute and time every turn of the
+                          event loop; write the figures to FILE and print them
+  --latency-report FILE   on the real clock: stamp every value pushed to a view and
+                          the end of that view's next paint; write p50, p99 and the
+                          worst delay per view class to FILE and print them
+  --save-churn            with --headless or --seconds: save watchlists, alerts,
+                          settings and the layout again on every step, each save
+                          stamped with a generation (a crash-safety test)
+  --check-churn MIN       check a store written by --save-churn (every set whole,
+                          none older than generation MIN), print it and exit
   --snapshot DIR          at the end, write a PNG of the main window and of each view
   --dump DIR              at the end, write each view's grid as DIR/<Class>-<n>.tsv,
                           the market's quotes of the shown instruments as

@@ -27,6 +27,7 @@ struct Options {
   std::optional<std::uint64_t> seed;
   std::optional<int> instruments;
   std::optional<int> rate;          // field updates per second
+  std::optional<double> pace;       // --pace: the watched instruments trade and quote X times as often
   std::optional<int> style;         // 1 light, 2 dark: this session only
   std::vector<OpenRequest> open;
   std::string snapshotDir;
@@ -38,6 +39,12 @@ struct Options {
   std::string traceFile;            // --trace-messages: every message a view receives, written here
   std::string replayFile;           // --replay: the market is this recording
   std::optional<double> speed;      // --speed: replay speed (needs --replay)
+  // --real-time: a headless or --seconds run on the real clock (N wall seconds).
+  bool realTime = false;
+  std::string soakReport;           // --soak-report: memory and event-loop figures of a timed run
+  std::string latencyReport;        // --latency-report: feed-to-pixel latency per view class
+  bool saveChurn = false;           // --save-churn: save generation-stamped user data on every step
+  std::optional<std::int64_t> checkChurn;  // --check-churn MIN: check the churned store and exit
 };
 
 // Parses argv. On a bad command line returns false with a one-line `error`.

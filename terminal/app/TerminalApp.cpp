@@ -2,6 +2,7 @@
 
 #include <QApplication>
 #include <QDir>
+#include <QEventLoop>
 #include <QFile>
 #include <QFileDialog>
 #include <QMessageBox>
@@ -10,9 +11,13 @@
 #include <QPixmap>
 #include <QStatusBar>
 #include <QTextStream>
+#include <chrono>
 #include <cstdio>
+#include <ctime>
 #include <filesystem>
+#include <fstream>
 #include <map>
+#include <unistd.h>
 
 #include "hostconfig/UserSettings.h"
 #include "hostview/MessageIds.h"
@@ -27,6 +32,9 @@
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/MarketFiles.h"
 #include "terminal/app/PlaybackBar.h"
+#include "terminal/app/RunFigures.h"
+#include "terminal/app/SaveChurn.h"
+#include "terminal/app/TerminalApplication.h"
 #include "terminal/app/SettingsDialog.h"
 #include "terminal/app/TerminalStyle.h"
 #include "terminal/host/Services.h"
@@ -34,6 +42,7 @@
 #include "terminal/host/ReplaySource.h"
 #include "terminal/sim/Market.h"
 #include "terminal/store/SqliteHostStore.h"
+#include "terminal/store/SqliteSettingsStorage.h"
 #include "terminal/store/Store.h"
 #include "terminal/views/Blotter.h"
 #include "terminal/views/TerminalView.h"
@@ -53,6 +62,21 @@ constexpr double kDefaultHeadlessSeconds = 10;
 // enough for a page count noticed once a second to be asked for and drawn.
 constexpr int kSettleMs = 1500;
 constexpr int kAutosaveMs = 60 * 1000;
+// --soak-report: memory is sampled every simulated minute; the growth is
+// measured from the tenth minute on, once the views' stores have filled.
+constexpr double kSoakSampleSeconds = 60;
+constexpr double kSoakWarmupSeconds = 600;
+
+std::int64_t WallUs() {
+  return std::chrono::duration_cast<std::chrono::microseconds>(std::chrono::steady_clock::now().time_since_epoch())
+      .count();
+}
+
+std::int64_t ThreadCpuUs() {
+  timespec ts{};
+  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &ts);
+  return static_cast<std::int64_t>(ts.tv_sec) * 1000000 + ts.tv_nsec / 1000;
+}
 
 StartParamMap Widen(const std::map<std::string, std::string>& in) {
   StartParamMap out;
@@ -117,6 +141,7 @@ bool TerminalApp::Start(std::string& error) {
   if (m_options.seed) ho.seed = *m_options.seed;
   if (m_options.instruments) ho.instruments = *m_options.instruments;
   if (m_options.rate) ho.fieldUpdatesPerSecond = *m_options.rate;
+  if (m_options.pace) ho.pace = *m_options.pace;
   ho.logToStderr = m_options.verbose;
   if (m_store) {
     const fs::path logs = m_store->Path().parent_path() / "logs";
@@ -127,8 +152,10 @@ bool TerminalApp::Start(std::string& error) {
     const auto ui = m_store->LoadSettings("ui.");
     if (auto it = ui.find("style"); it != ui.end() && (it->second == "1" || it->second == "2"))
       ho.styleId = std::stoi(it->second);
-    m_hostStore = std::make_unique<SqliteHostStore>(
-        *m_store, [this](const std::string& e) { Progress("error: " + e); });
+    m_hostStore = std::make_unique<SqliteHostStore>(*m_store, [this](const std::string& e) {
+      m_saveFailed = true;
+      Progress("error: " + e);
+    });
   }
   if (m_options.style) ho.styleId = *m_options.style;
   m_styleId = ho.styleId;
@@ -171,7 +198,10 @@ bool TerminalApp::Start(std::string& error) {
   MainWindow* w = m_window.get();
   connect(w, &MainWindow::openRequested, this, &TerminalApp::OpenFromMenu);
   connect(w, &MainWindow::activationChanged, this, &TerminalApp::OnActivation);
-  connect(w, &MainWindow::viewClosing, this, [this](CSuperBaseView* v) { m_runtime->DestroyView(v, false); });
+  connect(w, &MainWindow::viewClosing, this, [this](CSuperBaseView* v) {
+    if (m_latency) m_latency->RemoveView(v);
+    m_runtime->DestroyView(v, false);
+  });
   connect(w, &MainWindow::styleRequested, this, &TerminalApp::ChangeStyle);
   connect(w, &MainWindow::languageReloadRequested, this, [this] {
     // Column headings and font-size names come from the language table too.
@@ -200,6 +230,7 @@ bool TerminalApp::Start(std::string& error) {
   }
   for (const std::string& warning : marketWarnings) w->ShowNotice(QString::fromStdString(warning));
 
+  if (!m_options.latencyReport.empty()) m_latency = std::make_unique<LatencyRecorder>();
   int restored = 0;
   if (m_options.restoreLayout) restored = RestoreLayout();
   for (std::size_t k = 0; k < m_options.open.size(); ++k) {
@@ -222,15 +253,57 @@ bool TerminalApp::Start(std::string& error) {
   }
   if (restored == 0 && m_options.open.empty()) OpenDefaultLayout();
 
-  if (!timed()) {
+  if (!virtualClock()) {
     // Real time: move the market along with the monotonic clock.
     connect(&m_pump, &QTimer::timeout, this, [this] { Pump(platform::TickCount()); });
     m_pump.start(kPumpMs);
+  }
+  if (!timed()) {
     // The layout is also saved now and then, so a crash or a kill loses little of it.
     connect(&m_autosave, &QTimer::timeout, this, [this] { SaveLayout(); });
     m_autosave.start(kAutosaveMs);
   }
+  if (m_options.saveChurn) {
+    if (!m_store) {
+      error = "--save-churn needs the store";
+      return false;
+    }
+    // A run killed inside a generation left some sets at it and the rest one
+    // behind: the next run saves that generation again, whole, and goes on.
+    m_churnGeneration = std::max<std::int64_t>(0, churn::Inspect(*m_store, m_runtime->Market().Instruments()).Newest());
+  }
+  if (m_latency) {
+    // A view behind another's tab is never drawn: for the measurement every
+    // view gets a place of its own.
+    std::vector<ViewDock*> placed;
+    for (ViewDock* d : m_window->Docks()) {
+      if (d->isFloating()) continue;
+      bool behind = false;
+      for (ViewDock* p : placed)
+        if (m_window->tabifiedDockWidgets(p).contains(d)) behind = true;
+      if (behind) {
+        const Qt::DockWidgetArea area = m_window->dockWidgetArea(d);
+        m_window->removeDockWidget(d);
+        m_window->addDockWidget(area, d);
+        d->show();
+      }
+      placed.push_back(d);
+    }
+    // Each side of the window shares its height evenly.
+    m_window->resize(m_window->size().expandedTo(QSize(1600, 1200)));
+    for (Qt::DockWidgetArea area : {Qt::LeftDockWidgetArea, Qt::RightDockWidgetArea}) {
+      QList<QDockWidget*> side;
+      QList<int> heights;
+      for (ViewDock* d : placed)
+        if (!d->isFloating() && m_window->dockWidgetArea(d) == area) {
+          side << d;
+          heights << 300;
+        }
+      if (!side.isEmpty()) m_window->resizeDocks(side, heights, Qt::Vertical);
+    }
+  }
   m_window->show();
+  if (m_latency) StartLatency();
   return true;
 }
 
@@ -277,6 +350,7 @@ CSuperBaseView* TerminalApp::OpenView(const std::string& className, std::int64_t
     return nullptr;
   }
   ViewDock* dock = m_window->AddView(v, QString::fromStdString(className), objectName);
+  if (m_latency) m_latency->AddView(v, className);
   // The view gets 2 now; the view it replaces as the active one gets 1.
   m_window->ActivateView(v);
   (void)dock;
@@ -465,6 +539,14 @@ void TerminalApp::ShowSettings() {
 
 bool TerminalApp::SaveLayout() {
   if (!m_store || !m_window) return false;
+  if (!m_store->SaveLayout(CurrentLayout())) {
+    Progress("error: cannot save the layout: " + m_store->LastError());
+    return false;
+  }
+  return true;
+}
+
+SavedLayout TerminalApp::CurrentLayout() const {
   SavedLayout layout;
   for (ViewDock* d : m_window->Docks()) {
     CSuperBaseView* v = d->View();
@@ -481,11 +563,7 @@ bool TerminalApp::SaveLayout() {
   layout.windowGeometry.assign(geometry.constData(), static_cast<std::size_t>(geometry.size()));
   layout.windowState.assign(state.constData(), static_cast<std::size_t>(state.size()));
   if (ViewDock* active = m_window->DockOf(m_window->ActiveView())) layout.activeView = active->objectName().toStdString();
-  if (!m_store->SaveLayout(layout)) {
-    Progress("error: cannot save the layout: " + m_store->LastError());
-    return false;
-  }
-  return true;
+  return layout;
 }
 
 int TerminalApp::RestoreLayout() {
@@ -534,20 +612,59 @@ int TerminalApp::RunTimed() {
   // A replay runs to the end of its recording unless told otherwise.
   const double seconds =
       m_options.seconds.value_or(m_runtime->Replay() ? m_replaySeconds : kDefaultHeadlessSeconds);
+  if (m_options.realTime) return RunRealTime(seconds);
   auto& clock = platform::UseVirtualClock();
   const auto steps = static_cast<long long>(seconds * 1000.0 / kPumpMs + 0.5);
   const ReplaySource* replay = m_runtime->Replay();
   Progress((replay ? "replaying " + replay->Path() + " (" + replay->Session().date + ") for " : std::string("running ")) +
            QString::number(seconds).toStdString() + " simulated seconds with " +
            std::to_string(m_window->Docks().size()) + " views");
+  if (!m_options.soakReport.empty()) {
+    m_soak = std::make_unique<SoakFigures>();
+    m_soak->SampleRss(0, ReadRssKb(), static_cast<std::int64_t>(m_runtime->Market().TapeBytes() / 1024));
+  }
+  const long long sampleEvery = static_cast<long long>(kSoakSampleSeconds * 1000 / kPumpMs);
   for (long long i = 0; i < steps && !m_shutDown && !m_stopRequested; ++i) {
+    // One turn: what the event loop runs for one step of simulated time.
+    const std::int64_t wall0 = m_soak ? WallUs() : 0, cpu0 = m_soak ? ThreadCpuUs() : 0;
     clock.Advance(kPumpMs);
     Pump(clock.Now());
     platform::ProcessPosted();
     QCoreApplication::processEvents();
+    if (m_soak) {
+      m_soak->Turn(WallUs() - wall0, ThreadCpuUs() - cpu0);
+      if ((i + 1) % sampleEvery == 0)
+        m_soak->SampleRss(static_cast<double>(i + 1) * kPumpMs / 1000.0, ReadRssKb(),
+                          static_cast<std::int64_t>(m_runtime->Market().TapeBytes() / 1024));
+    }
+    if (m_options.saveChurn && !ChurnStep()) return 1;
+  }
+  if (m_soak) {
+    m_soak->SetPushes(m_runtime->Stats().pushes, seconds);
+    m_soak->SetSubscriptions(m_runtime->Stats().subscriptions);
+    if (!WriteSoakReport(kSoakWarmupSeconds)) return 1;
   }
   SettleViews();
+  return FinishTimedRun();
+}
+
+int TerminalApp::RunRealTime(double seconds) {
+  Progress("running " + QString::number(seconds).toStdString() + " seconds on the real clock with " +
+           std::to_string(m_window->Docks().size()) + " views");
+  // A loop of its own: quitting the application would close the window and its views first.
+  QEventLoop loop;
+  m_realTimeLoop = &loop;
+  QTimer::singleShot(static_cast<int>(seconds * 1000.0), &loop, &QEventLoop::quit);
+  if (!m_stopRequested) loop.exec();
+  m_realTimeLoop = nullptr;
+  Progress(std::to_string(m_runtime->Stats().pushes) + " values pushed to the views");
+  return FinishTimedRun();
+}
+
+int TerminalApp::FinishTimedRun() {
   int code = 0;
+  // What was measured ends where the run does, before the dumps and snapshots.
+  if (!WriteLatencyReport()) code = 1;
   if (!FinishRecording()) code = 1;
   if (!SaveLayout()) code = 1;
   std::string error;
@@ -573,6 +690,74 @@ int TerminalApp::RunTimed() {
   }
   Shutdown();
   return code;
+}
+
+bool TerminalApp::ChurnStep() {
+  const std::int64_t g = m_churnGeneration;
+  const auto& instruments = m_runtime->Market().Instruments();
+  m_saveFailed = false;
+  // Each save is one transaction, in a fixed order, as the terminal makes them.
+  m_hostStore->SaveWatchlists(StoredWatchlist::User, churn::Watchlists(g, instruments));
+  m_hostStore->SaveAlerts(churn::Alerts(g, instruments));
+  m_hostStore->SaveSetting(churn::kSettingKey, churn::HostSetting(g));
+  const bool user = SqliteSettingsStorage(*m_store).Write(churn::kSettingKey, churn::UserSetting(g));
+  SavedLayout layout = CurrentLayout();
+  churn::StampLayout(layout, g);
+  const bool saved = m_store->SaveLayout(layout);
+  if (m_saveFailed || !user || !saved) {
+    Progress("error: generation " + std::to_string(g) + " of the churn was not saved: " + m_store->LastError());
+    return false;
+  }
+  // Straight to the descriptor: the line must be out before the next save starts.
+  const std::string line = "churn: committed " + std::to_string(g) + "\n";
+  if (write(STDOUT_FILENO, line.data(), line.size()) < 0) return false;
+  ++m_churnGeneration;
+  return true;
+}
+
+void TerminalApp::StartLatency() {
+  m_runtime->SetPushObserver([this](CSuperBaseView* v) { m_latency->Pushed(v, WallUs()); });
+  auto* app = dynamic_cast<TerminalApplication*>(QCoreApplication::instance());
+  if (!app) return;
+  app->afterPaint = [this](QWidget* w) {
+    // The view whose window this widget belongs to.
+    for (QWidget* p = w; p; p = p->parentWidget())
+      if (m_latency->Watches(p)) {
+        m_latency->Painted(p, WallUs());
+        return;
+      }
+  };
+}
+
+bool TerminalApp::WriteLatencyReport() {
+  if (!m_latency) return true;
+  m_runtime->SetPushObserver({});
+  if (auto* app = dynamic_cast<TerminalApplication*>(QCoreApplication::instance())) app->afterPaint = {};
+  const std::string rate = std::to_string(m_options.rate.value_or(HostOptions().fieldUpdatesPerSecond));
+  const std::string text = m_latency->Report("feed-to-pixel latency, pace " + QString::number(m_options.pace.value_or(1.0)).toStdString() +
+                                             ", at most " + rate + " field updates per second, " +
+                                             std::to_string(m_runtime->Stats().pushes) + " values pushed");
+  m_latency.reset();
+  std::fputs(text.c_str(), stdout);
+  std::fflush(stdout);
+  std::ofstream f(m_options.latencyReport, std::ios::trunc);
+  if (!(f << text) || !f.flush()) {
+    Progress("error: cannot write " + m_options.latencyReport);
+    return false;
+  }
+  Progress("wrote the latency report to " + m_options.latencyReport);
+  return true;
+}
+
+bool TerminalApp::WriteSoakReport(double warmupSeconds) {
+  const std::string text = m_soak->Report(warmupSeconds, kPumpMs);
+  std::ofstream f(m_options.soakReport, std::ios::trunc);
+  if (!(f << text) || !f.flush()) {
+    Progress("error: cannot write " + m_options.soakReport);
+    return false;
+  }
+  Progress("wrote the soak report to " + m_options.soakReport);
+  return true;
 }
 
 void TerminalApp::SettleViews() {
@@ -644,7 +829,8 @@ void TerminalApp::RequestStop() {
   if (m_stopRequested) return;
   m_stopRequested = true;
   Progress("stopping");
-  if (!timed()) QCoreApplication::quit();
+  if (m_realTimeLoop) m_realTimeLoop->quit();
+  else if (!timed()) QCoreApplication::quit();
 }
 
 void TerminalApp::Shutdown() {
@@ -653,6 +839,7 @@ void TerminalApp::Shutdown() {
   m_pump.stop();
   m_autosave.stop();
   if (!timed()) SaveLayout();
+  WriteLatencyReport();
   FinishRecording();
   m_window->CloseAllViews();
 }

@@ -13,6 +13,7 @@
 #include "terminal/host/HostRuntime.h"
 
 class CSuperBaseView;
+class QEventLoop;
 struct CRuntimeClass;
 
 namespace term {
@@ -26,6 +27,9 @@ class Blotter;
 class SqliteHostStore;
 class Store;
 class ViewDock;
+class LatencyRecorder;
+class SoakFigures;
+struct SavedLayout;
 
 class TerminalApp : public QObject, public IHostShell {
   Q_OBJECT
@@ -66,6 +70,8 @@ class TerminalApp : public QObject, public IHostShell {
   CSuperBaseView* OpenView(const std::string& className, std::int64_t productId, const std::string& code,
                            const StartParamMap& params, const QString& objectName, std::string& error);
   bool SaveLayout();
+  // The layout as it stands: the docks, their views' start parameters, the window.
+  SavedLayout CurrentLayout() const;
   // The user's watchlists to and from a text file (File menu). Export: false
   // with `error` when the file cannot be written. Import: the problems (the
   // file is refused as a whole), or an empty list when the lists were added.
@@ -101,8 +107,19 @@ class TerminalApp : public QObject, public IHostShell {
   // The whole application (menus, docks, status bar, dialogs) in the style's colours.
   void ApplyStyleToApplication();
   void Progress(const std::string& line) const;
-  // Headless or --seconds: the virtual clock, nobody at the window.
+  // Headless or --seconds: nobody at the window; the virtual clock unless --real-time.
   bool timed() const { return m_options.headless || m_options.seconds.has_value(); }
+  bool virtualClock() const { return timed() && !m_options.realTime; }
+  // --real-time: the event loop on the real clock for the run's seconds.
+  int RunRealTime(double seconds);
+  // The end of a timed run: recording, layout, dumps, snapshots. The exit code.
+  int FinishTimedRun();
+  // --save-churn: one generation of watchlists, alerts, settings and layout.
+  bool ChurnStep();
+  // --latency-report: stamps pushes and paints from here on.
+  void StartLatency();
+  bool WriteLatencyReport();
+  bool WriteSoakReport(double warmupSeconds);
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
   // Ends the recording, if any, and says how it went. False when it failed.
@@ -127,6 +144,11 @@ class TerminalApp : public QObject, public IHostShell {
   int m_styleId = 1;
   int m_startExitCode = 1;
   ILogger* m_log = nullptr;
+  bool m_saveFailed = false;             // a save reported an error since the flag was cleared
+  std::int64_t m_churnGeneration = -1;   // --save-churn: the next generation to save
+  std::unique_ptr<LatencyRecorder> m_latency;
+  std::unique_ptr<SoakFigures> m_soak;
+  QEventLoop* m_realTimeLoop = nullptr;  // --real-time: the loop running the timed seconds
 };
 
 }  // namespace term

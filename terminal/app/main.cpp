@@ -15,6 +15,8 @@
 #include "terminal/app/MainWindow.h"
 #include "terminal/app/Options.h"
 #include "terminal/app/TerminalApp.h"
+#include "terminal/app/TerminalApplication.h"
+#include "terminal/app/SaveChurn.h"
 #include "terminal/host/MarketRecording.h"
 #include "terminal/host/Services.h"
 #include "terminal/sim/Market.h"
@@ -90,6 +92,8 @@ int main(int argc, char** argv) {
   }
   if (options.listInstruments) return ListInstruments(options);
 
+  if (options.checkChurn) return term::CheckChurn(options);
+
   const bool timed = options.headless || options.seconds.has_value();
   if (options.headless) {
     setenv("QT_QPA_PLATFORM", "offscreen", 1);
@@ -98,7 +102,7 @@ int main(int argc, char** argv) {
   }
   if (timed) {
     // One clock for the whole process from the first timer on.
-    platform::UseVirtualClock();
+    if (!options.realTime) platform::UseVirtualClock();
     auto dialogs = std::make_unique<platform::RecordingDialogService>();
     dialogs->onShown = [](const platform::RecordingDialogService::Shown& s) {
       if (s.kind == platform::RecordingDialogService::Shown::Box)
@@ -112,7 +116,7 @@ int main(int argc, char** argv) {
   // Qt sees only the program name: the options are the terminal's (Qt would
   // take "--style" for its own).
   int qtArgc = 1;
-  QApplication app(qtArgc, argv);
+  term::TerminalApplication app(qtArgc, argv);
   QApplication::setApplicationName("marketviews-terminal");
 
   const std::filesystem::path dataDir =

@@ -79,6 +79,7 @@ HostRuntime::HostRuntime(const HostOptions& options, IHostShell* shell, IHostSto
   config.seed = options.seed;
   config.instruments = options.instruments;
   config.fieldUpdatesPerSecond = options.fieldUpdatesPerSecond;
+  config.pace = options.pace;
   config.sessionDate = options.sessionDate;
   config.sessionStartSeconds = options.sessionStartSeconds;
   if (options.replay) {
@@ -331,6 +332,10 @@ std::vector<std::string> HostRuntime::ImportWatchlists(const std::string& text) 
   return {};
 }
 HostStats HostRuntime::Stats() const { return d->stats; }
+
+void HostRuntime::SetPushObserver(std::function<void(CSuperBaseView*)> observer) {
+  d->subscriptions->SetPushObserver(std::move(observer));
+}
 
 std::vector<int> HostRuntime::QuoteInstruments() const { return d->subscriptions->QuoteInstruments(); }
 

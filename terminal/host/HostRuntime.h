@@ -86,6 +86,7 @@ struct HostOptions {
   std::uint64_t seed = 20261207;
   int instruments = 3000;               // 50 .. 500000
   int fieldUpdatesPerSecond = 4000;     // over subscribed instruments
+  double pace = 1.0;                    // the simulator's pace (MarketConfig::pace)
   std::string sessionDate = "2026-12-07";  // trading day the market plays ("%Y-%m-%d")
   int sessionStartSeconds = 10 * 3600 + 30 * 60;  // time of day at the first Pump
   std::string configFile;               // "KEY=VALUE" lines overriding the settings; optional
@@ -203,6 +204,9 @@ class HostRuntime : public IViewHost {
   std::vector<std::string> ImportWatchlists(const std::string& text);
 
   HostStats Stats() const;
+  // Hears of every 410 just before it reaches its view (latency measurement);
+  // an empty function stops it.
+  void SetPushObserver(std::function<void(CSuperBaseView*)> observer);
   // The market indexes of the instruments some view holds a quote
   // subscription for (kind 0, param 0), in subscription order.
   std::vector<int> QuoteInstruments() const;

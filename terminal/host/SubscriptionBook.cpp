@@ -253,7 +253,12 @@ void SubscriptionBook::CollectPushes(Answers& out) {
 void SubscriptionBook::Deliver(Answers& list, UINT msg) {
   for (auto& [v, u] : list) {
     if (!views_.Live(v)) continue;
-    if (msg == hm::FieldValue) ++stats_.pushes; else ++stats_.answers;
+    if (msg == hm::FieldValue) {
+      ++stats_.pushes;
+      if (onPush_) onPush_(v);
+    } else {
+      ++stats_.answers;
+    }
     views_.Deliver(v, msg, ToLParam(&u));
   }
 }

@@ -37,6 +37,8 @@ class SubscriptionBook {
   // Forgets everything of `view`.
   void Drop(CSuperBaseView* view);
   std::size_t Count() const { return index_.size(); }
+  // Called just before each 410 reaches its view (measurements); may be empty.
+  void SetPushObserver(std::function<void(CSuperBaseView*)> observer) { onPush_ = std::move(observer); }
   // Called in Pump with every change the market reported, before the pushes
   // (the changes of names and remarks go to the leading price view as 414).
   using ChangeObserver = std::function<void(const std::vector<std::pair<int, std::uint32_t>>&)>;
@@ -89,6 +91,7 @@ class SubscriptionBook {
   std::unordered_map<int, std::vector<std::size_t>> byInstrument_;
   std::unordered_map<CSuperBaseView*, Pending> pending_;
   std::vector<Fetch> fetches_;
+  std::function<void(CSuperBaseView*)> onPush_;
   std::set<std::pair<std::int64_t, std::string>> unknownLogged_;
   ChangeObserver observer_;
 };

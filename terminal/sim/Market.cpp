@@ -941,11 +941,11 @@ void Market::Impl::StepOnce() {
   // exceed the configured rate (about five fields change per event).
   if (!hot.empty()) {
     double sum = 0;
-    for (int i : hot) sum += 2.0 * info[i].activity;
+    for (int i : hot) sum += 2.0 * info[i].activity * config.pace;
     const double budget = std::max(1.0, config.fieldUpdatesPerSecond / 5.0);
     const double scale = sum > budget ? budget / sum : 1.0;
     for (int i : hot) {
-      const double p = std::min(0.9, 2.0 * info[i].activity * scale * (kStepMs / 1000.0));
+      const double p = std::min(0.9, 2.0 * info[i].activity * config.pace * scale * (kStepMs / 1000.0));
       if (rng.Chance(p)) Event(i, rng);
     }
   }
@@ -1222,6 +1222,12 @@ std::vector<DepthLevel> Market::Book(int index, int levels) {
     }
   }
   return out;
+}
+
+std::size_t Market::TapeBytes() const {
+  std::size_t bytes = d->tapes.capacity() * sizeof(std::vector<Trade>);
+  for (const auto& tape : d->tapes) bytes += tape.capacity() * sizeof(Trade);
+  return bytes;
 }
 
 const std::vector<Trade>& Market::Trades(int index) {

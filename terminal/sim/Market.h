@@ -33,6 +33,9 @@ struct MarketConfig {
   std::uint64_t seed = 20261207;
   int instruments = 3000;            // clamped to 60 .. 500000
   int fieldUpdatesPerSecond = 4000;  // target over the instruments of interest
+  // Each watched instrument trades and quotes this many times as often (a
+  // heavier feed for soak and latency runs); 1 is the market as it is.
+  double pace = 1.0;
   std::string sessionDate = "2026-12-07";
   int sessionStartSeconds = 10 * 3600 + 30 * 60;  // time of day at `startTick`
   std::uint32_t startTick = 0;
@@ -109,6 +112,9 @@ class Market {
   const std::vector<JProduct>& Products() const;
   const std::vector<JExchangeList>& Exchanges() const;
   const std::vector<JInstrumentUnderlying>& Instruments() const;
+  // The bytes the day's trade tapes hold (they grow with every trade: the
+  // simulated exchange keeps the day), for memory figures.
+  std::size_t TapeBytes() const;
   const std::vector<TickBand>& TickBands() const;
   const std::vector<JSector>& Sectors() const;
   const std::vector<JRemarkMessage>& RemarkMessages() const;

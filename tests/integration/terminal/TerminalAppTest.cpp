@@ -105,6 +105,22 @@ TEST(Options, CommandLineIsReadAsAUserWritesIt) {
   EXPECT_EQ(*o.listInstruments, 0);            // no count: all
   EXPECT_EQ(o.dumpDir, "d");
 
+  // Measured runs: the real clock headless, a heavier feed, the reports.
+  o = Parse({"--headless", "--real-time", "--seconds", "60", "--pace", "10", "--latency-report", "lat.tsv"}, ok, error);
+  ASSERT_TRUE(ok) << error;
+  EXPECT_TRUE(o.realTime);
+  EXPECT_DOUBLE_EQ(*o.pace, 10.0);
+  EXPECT_EQ(o.latencyReport, "lat.tsv");
+  o = Parse({"--latency-report", "lat.tsv"}, ok, error);  // a window runs on the real clock anyway
+  ASSERT_TRUE(ok) << error;
+  o = Parse({"--headless", "--soak-report", "soak.txt", "--save-churn"}, ok, error);
+  ASSERT_TRUE(ok) << error;
+  EXPECT_EQ(o.soakReport, "soak.txt");
+  EXPECT_TRUE(o.saveChurn);
+  o = Parse({"--check-churn", "17"}, ok, error);
+  ASSERT_TRUE(ok) << error;
+  EXPECT_EQ(*o.checkChurn, 17);
+
   o = Parse({"--list-instruments", "4"}, ok, error);
   ASSERT_TRUE(ok);
   EXPECT_EQ(*o.listInstruments, 4);
@@ -138,7 +154,14 @@ TEST(Options, CommandLineIsReadAsAUserWritesIt) {
                                          {{"--dump", "x"}, "--seconds"},
                                          {{"--param", "A=B"}, "after the --open"},
                                          {{"--open", "CTradeView", "--param", "AB"}, "KEY=VALUE"},
-                                         {{"--frobnicate"}, "unknown option"}}) {
+                                         {{"--frobnicate"}, "unknown option"},
+                                         {{"--real-time"}, "headless or --seconds"},
+                                         {{"--headless", "--real-time", "--soak-report", "f"}, "virtual clock"},
+                                         {{"--soak-report", "f"}, "virtual clock"},
+                                         {{"--headless", "--latency-report", "f"}, "--real-time"},
+                                         {{"--seconds", "5", "--real-time", "--save-churn"}, "virtual clock"},
+                                         {{"--pace", "0"}, "--pace"},
+                                         {{"--check-churn", "-1"}, "--check-churn"}}) {
     Parse(bad.args, ok, error);
     EXPECT_FALSE(ok) << bad.args[0];
     EXPECT_NE(error.find(bad.says), std::string::npos) << error;

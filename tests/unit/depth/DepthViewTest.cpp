@@ -229,10 +229,15 @@ TEST_F(DepthView, Highlight_ClearedOnTheFirstTickAtLeast1500msAfterTheChange) {
     host.Advance(100);  // lands on a tick (ticks every 200 ms from activation)
     const std::uint32_t age = host.clock.Now() - changedAt;
     cleared = !highlighted(3);
-    if (age < 1500) EXPECT_FALSE(cleared) << "age " << age;
-    else EXPECT_TRUE(cleared) << "age " << age;
+    if (age < 1500) {
+      EXPECT_FALSE(cleared) << "age " << age;
+    } else {
+      EXPECT_TRUE(cleared) << "age " << age;
+    }
     host.Advance(100);
-    if (!cleared) EXPECT_TRUE(highlighted(3)) << "marks age on ticks only";
+    if (!cleared) {
+      EXPECT_TRUE(highlighted(3)) << "marks age on ticks only";
+    }
   }
   EXPECT_TRUE(cleared);
   CGridCell cell;

@@ -428,3 +428,32 @@ TEST(Market, IndicesTickWithoutABookAndTheFirstStartHasALiquidStock) {
   EXPECT_GT(m.QuoteOf(stock).trades, m.QuoteOf(BusyEquity(m)).trades / 2) << "one of the busiest";
   EXPECT_GT(m.Book(stock, 1)[0].bid, 0);
 }
+
+TEST(Market, APacedMarketTradesMoreOftenAndItsTapesHoldEveryTrade) {
+  // The same watched instruments for ten simulated minutes at the market's own
+  // pace and at ten times it: the paced one trades several times as often.
+  std::size_t trades[2] = {0, 0};
+  std::size_t bytes[2] = {0, 0};
+  for (int k = 0; k < 2; ++k) {
+    MarketConfig c = Config();
+    c.pace = k == 0 ? 1.0 : 10.0;
+    c.fieldUpdatesPerSecond = 40000;
+    Market m(c);
+    const int i = BusyEquity(m);
+    std::vector<int> watched{i};
+    for (int j = 0; j < int(m.Instruments().size()) && watched.size() < 10; j += 97)
+      if (m.Instruments()[j].productType == "ES" && j != i) watched.push_back(j);
+    for (int w : watched) m.AddInterest(w);
+    const std::size_t before = m.TapeBytes();
+    std::size_t start = 0;
+    for (int w : watched) start += m.Trades(w).size();
+    m.AdvanceTo(600 * 1000);
+    for (int w : watched) trades[k] += m.Trades(w).size();
+    trades[k] -= start;
+    bytes[k] = m.TapeBytes() - before;
+    EXPECT_GE(m.TapeBytes(), (start + trades[k]) * sizeof(sim::Trade));
+  }
+  EXPECT_GT(trades[0], 0u);
+  EXPECT_GT(trades[1], 4 * trades[0]) << trades[0] << " vs " << trades[1];
+  EXPECT_GT(bytes[1], bytes[0]);
+}
