@@ -110,21 +110,95 @@ TradeTape& TradeTape::Instance() {
 void TradeTape::ResetForTests() {
   std::lock_guard lock(mu_);
   tapes_.clear();
+  scratch_ = TradeRecord{};
   version_.store(0, std::memory_order_release);
+}
+
+namespace {
+
+constexpr std::size_t kFields = 4;
+
+std::array<const std::wstring*, kFields> FieldsOf(const TradeRecord& t) { return {&t.time, &t.price, &t.volume, &t.side}; }
+std::array<std::wstring*, kFields> FieldsOf(TradeRecord& t) { return {&t.time, &t.price, &t.volume, &t.side}; }
+
+}  // namespace
+
+bool TradeTape::Packs(const TradeRecord& trade) {
+  for (const std::wstring* field : FieldsOf(trade)) {
+    if (field->size() > 255) return false;
+    for (const wchar_t c : *field)
+      if (c < 0 || c > 0x7F) return false;
+  }
+  return true;
+}
+
+bool TradeTape::SameAsPacked(const Block& block, int slot, const TradeRecord& trade) {
+  const Slot& s = block.places[std::size_t(slot)];
+  std::size_t at = s.at;
+  const auto fields = FieldsOf(trade);
+  for (std::size_t f = 0; f < kFields; ++f) {
+    const std::wstring& field = *fields[f];
+    if (field.size() != s.length[f]) return false;
+    for (const wchar_t c : field)
+      if (static_cast<unsigned char>(block.text[at++]) != static_cast<unsigned>(c)) return false;
+  }
+  return true;
+}
+
+// Drops the text of replaced trades.
+void TradeTape::Repack(Block& block) {
+  std::string text;
+  text.reserve(block.text.size() - block.stale);
+  for (int i = 0; i < mvd::kTradesPerPage; ++i) {
+    Slot& s = block.places[std::size_t(i)];
+    if (!block.held[std::size_t(i)] || block.unpacked.count(i)) continue;
+    std::size_t length = 0;
+    for (const std::uint8_t l : s.length) length += l;
+    const std::size_t at = text.size();
+    text.append(block.text, s.at, length);
+    s.at = static_cast<std::uint32_t>(at);
+  }
+  block.text = std::move(text);
+  block.stale = 0;
 }
 
 bool TradeTape::StoreLocked(Tape& tape, TradeRecord&& trade) {
   if (trade.number <= 0) return false;
   const int page = mvd::PageOfTrade(trade.number);
-  std::unique_ptr<Block>& block = tape.blocks[page];
-  if (!block) block = std::make_unique<Block>();
-  TradeRecord& slot = block->trades[std::size_t((trade.number - 1) % mvd::kTradesPerPage)];
-  if (slot.number == 0) {
-    ++block->count;
+  std::unique_ptr<Block>& owned = tape.blocks[page];
+  if (!owned) owned = std::make_unique<Block>();
+  Block& block = *owned;
+  const int slot = (trade.number - 1) % mvd::kTradesPerPage;
+  version_.fetch_add(1, std::memory_order_release);
+
+  const bool held = block.held[std::size_t(slot)];
+  const auto unpacked = block.unpacked.find(slot);
+  const bool wasPacked = held && unpacked == block.unpacked.end();
+  // The live page brings the same trades again and again: keep the text as it is.
+  if (wasPacked && SameAsPacked(block, slot, trade)) return true;
+  if (!held) {
+    block.held[std::size_t(slot)] = true;
+    ++block.count;
     ++tape.count;
   }
-  slot = std::move(trade);
-  version_.fetch_add(1, std::memory_order_release);
+  Slot& s = block.places[std::size_t(slot)];
+  if (wasPacked)
+    for (const std::uint8_t l : s.length) block.stale += l;
+
+  if (!Packs(trade)) {
+    block.unpacked[slot] = std::move(trade);
+  } else {
+    if (unpacked != block.unpacked.end()) block.unpacked.erase(unpacked);
+    s.at = static_cast<std::uint32_t>(block.text.size());
+    const auto fields = FieldsOf(trade);
+    for (std::size_t f = 0; f < kFields; ++f) {
+      s.length[f] = static_cast<std::uint8_t>(fields[f]->size());
+      for (const wchar_t c : *fields[f]) block.text.push_back(static_cast<char>(c));
+    }
+  }
+  if (block.stale > 0 && block.stale * 2 > block.text.size()) Repack(block);
+  // A whole page seldom changes again: give back what growing the text reserved.
+  if (block.count == mvd::kTradesPerPage && block.text.capacity() > block.text.size() + 64) block.text.shrink_to_fit();
   return true;
 }
 
@@ -146,14 +220,31 @@ bool TradeTape::Store(const InstrumentKey& key, TradeRecord trade) {
   return StoreLocked(tapes_[key], std::move(trade));
 }
 
-const TradeRecord* TradeTape::FindLocked(const InstrumentKey& key, std::int32_t number) const {
+const TradeTape::Block* TradeTape::BlockLocked(const InstrumentKey& key, std::int32_t number) const {
   if (number <= 0) return nullptr;
   const auto tape = tapes_.find(key);
   if (tape == tapes_.end()) return nullptr;
   const auto block = tape->second.blocks.find(mvd::PageOfTrade(number));
   if (block == tape->second.blocks.end()) return nullptr;
-  const TradeRecord& r = block->second->trades[std::size_t((number - 1) % mvd::kTradesPerPage)];
-  return r.number == 0 ? nullptr : &r;
+  return block->second->held[std::size_t((number - 1) % mvd::kTradesPerPage)] ? block->second.get() : nullptr;
+}
+
+const TradeRecord* TradeTape::FindLocked(const InstrumentKey& key, std::int32_t number) const {
+  const Block* block = BlockLocked(key, number);
+  if (!block) return nullptr;
+  const int slot = (number - 1) % mvd::kTradesPerPage;
+  if (const auto unpacked = block->unpacked.find(slot); unpacked != block->unpacked.end()) return &unpacked->second;
+  // Unpacked into one record kept for the purpose: assign() reuses its strings' room.
+  const Slot& s = block->places[std::size_t(slot)];
+  std::size_t at = s.at;
+  const auto fields = FieldsOf(scratch_);
+  for (std::size_t f = 0; f < kFields; ++f) {
+    const auto* begin = reinterpret_cast<const unsigned char*>(block->text.data()) + at;
+    fields[f]->assign(begin, begin + s.length[f]);
+    at += s.length[f];
+  }
+  scratch_.number = number;
+  return &scratch_;
 }
 
 bool TradeTape::Get(const InstrumentKey& key, std::int32_t number, TradeRecord& out) const {
@@ -162,7 +253,7 @@ bool TradeTape::Get(const InstrumentKey& key, std::int32_t number, TradeRecord& 
 
 bool TradeTape::Has(const InstrumentKey& key, std::int32_t number) const {
   std::lock_guard lock(mu_);
-  return FindLocked(key, number) != nullptr;
+  return BlockLocked(key, number) != nullptr;
 }
 
 int TradeTape::CountInPage(const InstrumentKey& key, int page) const {
@@ -192,7 +283,7 @@ int TradeTape::CountRange(const InstrumentKey& key, std::int32_t from, std::int3
       held += block->second->count;
       continue;
     }
-    for (std::int64_t n = lo; n <= hi; ++n) held += block->second->trades[std::size_t(n - first)].number != 0;
+    for (std::int64_t n = lo; n <= hi; ++n) held += block->second->held[std::size_t(n - first)];
   }
   return held;
 }

@@ -13,9 +13,14 @@
 //
 // Trades are kept in blocks of one page (trades (p-1)*100+1 .. p*100 form
 // block p), so looking a trade up costs the same however long the tape is,
-// and a page's completeness is one count.
+// and a page's completeness is one count. A view keeps every trade of the day
+// it has shown, so a block holds its trades' texts packed as bytes (about
+// 35 bytes a trade instead of about 280 as four wide strings); a trade whose
+// text is not plain ASCII, or has a field longer than 255, is kept as it
+// came.
 #include <array>
 #include <atomic>
+#include <bitset>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -72,8 +77,9 @@ class TradeTape {
   // The trade, or false (out untouched) when it has not arrived.
   bool Get(const InstrumentKey& key, std::int32_t number, TradeRecord& out) const;
   bool Has(const InstrumentKey& key, std::int32_t number) const;
-  // Runs f(const TradeRecord&) under the lock when the trade is held (no copy);
-  // returns whether it was. Do not call the tape from f.
+  // Runs f(const TradeRecord&) under the lock when the trade is held; returns
+  // whether it was. The record lives until f returns. Do not call the tape
+  // from f.
   template <class F>
   bool Read(const InstrumentKey& key, std::int32_t number, F&& f) const {
     std::lock_guard lock(mu_);
@@ -97,18 +103,33 @@ class TradeTape {
   void ResetForTests();
 
  private:
+  // Where a held trade's four fields lie in its block's text, back to back.
+  struct Slot {
+    std::uint32_t at = 0;
+    std::array<std::uint8_t, 4> length{};
+  };
   struct Block {
-    std::array<TradeRecord, mvd::kTradesPerPage> trades{};
+    std::string text;
+    std::array<Slot, mvd::kTradesPerPage> places{};  // not "slots": a Qt keyword
+    std::bitset<mvd::kTradesPerPage> held;
+    std::unordered_map<int, TradeRecord> unpacked;  // by slot: text that does not pack
+    std::size_t stale = 0;                          // bytes of text of replaced trades
     int count = 0;
   };
   struct Tape {
     std::unordered_map<int, std::unique_ptr<Block>> blocks;  // by page
     std::size_t count = 0;
   };
+  const Block* BlockLocked(const InstrumentKey& key, std::int32_t number) const;
+  // The trade, unpacked into scratch_ when packed; null when not held.
   const TradeRecord* FindLocked(const InstrumentKey& key, std::int32_t number) const;
   bool StoreLocked(Tape& tape, TradeRecord&& trade);
+  static bool Packs(const TradeRecord& trade);
+  static bool SameAsPacked(const Block& block, int slot, const TradeRecord& trade);
+  static void Repack(Block& block);
 
   mutable std::mutex mu_;
   std::unordered_map<InstrumentKey, Tape> tapes_;
   std::atomic<std::uint64_t> version_{0};
+  mutable TradeRecord scratch_;  // under mu_
 };

@@ -2,7 +2,6 @@
 
 #include <set>
 #include <sstream>
-#include <unordered_map>
 
 #include "terminal/host/HostRuntime.h"
 #include "terminal/sim/Market.h"
@@ -22,32 +21,6 @@ int Limit(const HostSettings& settings, const char* key, int fallback) {
   const int n = settings.GetInt(key, fallback);
   return n > 0 ? n : fallback;
 }
-
-// The market's instruments by exchange and code (the first in market order),
-// built once per import: a file of thousands of lines against a market of
-// hundreds of thousands of instruments must not scan the market per line.
-class ExchangeIndex {
- public:
-  explicit ExchangeIndex(const sim::Market& market) : market_(market) {}
-  // The first instrument of `exchange` with `code`; -1 when none.
-  int Find(const std::string& exchange, const std::string& code) {
-    if (index_.empty()) {
-      const auto& list = market_.Instruments();
-      index_.reserve(list.size());
-      for (std::size_t i = 0; i < list.size(); ++i)
-        index_.emplace(Key(Trim(list[i].exchangeCode), list[i].instrumentCode), int(i));
-    }
-    const auto it = index_.find(Key(exchange, code));
-    return it == index_.end() ? -1 : it->second;
-  }
-
- private:
-  static std::string Key(const std::string& exchange, const std::string& code) {
-    return std::to_string(exchange.size()) + ':' + exchange + code;  // the length keeps pairs apart
-  }
-  const sim::Market& market_;
-  std::unordered_map<std::string, int> index_;
-};
 
 struct Line {
   int number;
@@ -104,7 +77,6 @@ WatchlistImport ReadWatchlistsText(const std::string& text, const std::vector<St
   for (const StoredWatchlist& w : existing) names.insert(w.name);
 
   std::vector<StoredWatchlist> lists;
-  ExchangeIndex instruments(market);
   for (const auto& block : blocks) {
     StoredWatchlist w;
     w.kind = StoredWatchlist::User;
@@ -124,7 +96,7 @@ WatchlistImport ReadWatchlistsText(const std::string& text, const std::vector<St
       }
       const std::string exchange = Trim(line.text.substr(0, colon));
       const std::string code = Trim(line.text.substr(colon + 1));
-      const int idx = instruments.Find(exchange, code);
+      const int idx = market.FindOnExchange(exchange, code);
       if (idx < 0) {
         result.problems.push_back(where + exchange + ":" + code + " is not a known instrument");
         continue;

@@ -14,6 +14,15 @@
 namespace sim {
 namespace {
 
+// Without surrounding blanks (space, tab, CR, LF).
+std::string TrimBlanks(std::string_view s) {
+  const auto blank = [](char c) { return c == ' ' || c == '\t' || c == '\r' || c == '\n'; };
+  std::size_t b = 0, e = s.size();
+  while (b < e && blank(s[b])) ++b;
+  while (e > b && blank(s[e - 1])) --e;
+  return std::string(s.substr(b, e - b));
+}
+
 // splitmix64: a tiny, well-mixed generator whose output depends only on the
 // seed, so streams can be re-created (the tape of an instrument is generated
 // twice: once as a summary at start, once in full when someone asks).
@@ -278,6 +287,9 @@ struct Market::Impl {
   std::map<std::pair<std::int64_t, std::string>, int, std::less<>> byKey;
   std::unordered_map<std::string, int> byCode, byChart;
   std::unordered_map<int, std::vector<int>> aliasesOf;
+  // The products listed on each exchange (by its code without blanks): a
+  // handful each, so an exchange and a code find an instrument through byKey.
+  std::map<std::string, std::vector<std::int64_t>, std::less<>> productsOn;
   std::vector<int> bases;  // instruments with their own market
   std::vector<int> interest;
   std::vector<int> hot;    // sorted base indices with interest
@@ -402,6 +414,8 @@ void Market::Impl::AddInstrument(JInstrumentUnderlying rec, InstInfo inf) {
   byKey.emplace(std::make_pair(rec.productId, rec.instrumentCode), idx);
   byCode.emplace(rec.instrumentCode, idx);
   byChart.emplace(rec.chartCode, idx);
+  std::vector<std::int64_t>& products = productsOn[TrimBlanks(rec.exchangeCode)];
+  if (std::find(products.begin(), products.end(), rec.productId) == products.end()) products.push_back(rec.productId);
   if (inf.alias >= 0) aliasesOf[inf.alias].push_back(idx);
   instruments.push_back(std::move(rec));
   info.push_back(inf);
@@ -1042,6 +1056,17 @@ int Market::Find(std::int64_t productId, std::string_view code) const {
 int Market::FindByCode(std::string_view code) const {
   auto it = d->byCode.find(std::string(code));
   return it == d->byCode.end() ? -1 : it->second;
+}
+int Market::FindOnExchange(std::string_view exchange, std::string_view code) const {
+  const auto products = d->productsOn.find(exchange);
+  if (products == d->productsOn.end()) return -1;
+  int first = -1;
+  for (const std::int64_t product : products->second) {
+    const int idx = Find(product, code);
+    if (idx >= 0 && (first < 0 || idx < first) && TrimBlanks(d->instruments[std::size_t(idx)].exchangeCode) == exchange)
+      first = idx;
+  }
+  return first;
 }
 int Market::FindByChartCode(std::string_view chartCode) const {
   auto it = d->byChart.find(std::string(chartCode));

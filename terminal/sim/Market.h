@@ -121,6 +121,9 @@ class Market {
   // -1 when unknown.
   int Find(std::int64_t productId, std::string_view code) const;
   int FindByCode(std::string_view code) const;       // first instrument with that code
+  // The first instrument with `code` whose exchange code, without surrounding
+  // blanks, is `exchange`.
+  int FindOnExchange(std::string_view exchange, std::string_view code) const;
   int FindByChartCode(std::string_view chartCode) const;
   const JExchangeList* FindExchange(std::string_view code) const;
   const JProduct* FindProduct(std::int64_t productId) const;

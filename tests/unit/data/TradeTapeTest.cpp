@@ -2,6 +2,8 @@
 // dropped without losing the rest, a trade never held twice.
 #include <gtest/gtest.h>
 
+#include <vector>
+
 #include "data/TradeTape.h"
 
 namespace {
@@ -80,6 +82,67 @@ TEST(TradeTape, PagesAreCountedByTheirHundredTrades) {
   EXPECT_EQ(mvd::PageOfTrade(100), 1);
   EXPECT_EQ(mvd::PageOfTrade(101), 2);
   EXPECT_EQ(mvd::FirstTradeOfPage(5), 401);
+}
+
+}  // namespace
+
+namespace {
+
+TradeRecord Trade(int number, std::wstring time, std::wstring price, std::wstring volume, std::wstring side) {
+  return TradeRecord{number, std::move(time), std::move(price), std::move(volume), std::move(side)};
+}
+
+void ExpectHeld(const TradeTape& tape, const TradeRecord& want) {
+  TradeRecord got;
+  ASSERT_TRUE(tape.Get(kKey, want.number, got)) << want.number;
+  EXPECT_EQ(got.number, want.number);
+  EXPECT_EQ(got.time, want.time) << want.number;
+  EXPECT_EQ(got.price, want.price) << want.number;
+  EXPECT_EQ(got.volume, want.volume) << want.number;
+  EXPECT_EQ(got.side, want.side) << want.number;
+}
+
+TEST(TradeTape_Text, EveryTextComesBackAsItArrivedWhateverItHolds) {
+  TradeTape tape;
+  const std::vector<TradeRecord> trades = {
+      Trade(1, L"2026120710:30:01", L"12.345", L"1500", L"1"),
+      Trade(2, L"", L"", L"", L""),
+      Trade(3, L"2026120710:30:03", L"\u00A512.5", L"\u4E00\u767E", L"\u00E9"),   // beyond ASCII
+      Trade(4, std::wstring(256, L'9'), L"1", L"2", L"3"),                         // a field over 255
+      Trade(5, std::wstring(255, L'8'), std::wstring(255, L'7'), L"x", L"\x7F"),   // the longest that packs
+      Trade(6, L"t", std::wstring(1, wchar_t(0x10FFFF)), std::wstring(1, wchar_t(-1)), L"0"),
+      Trade(100, L"last of the page", L"0.001", L"1", L"2"),
+  };
+  for (const TradeRecord& t : trades) ASSERT_TRUE(tape.Store(kKey, t));
+  for (const TradeRecord& t : trades) ExpectHeld(tape, t);
+  EXPECT_EQ(tape.Count(kKey), trades.size());
+  EXPECT_EQ(tape.CountRange(kKey, 1, 100), int(trades.size()));
+  EXPECT_EQ(tape.CountRange(kKey, 3, 6), 4);
+  EXPECT_FALSE(tape.Has(kKey, 7));
+  // What one Read hands out does not leak into the next.
+  std::wstring first, second;
+  tape.Read(kKey, 4, [&](const TradeRecord& t) { first = t.time; });
+  tape.Read(kKey, 1, [&](const TradeRecord& t) { second = t.time; });
+  EXPECT_EQ(first, std::wstring(256, L'9'));
+  EXPECT_EQ(second, L"2026120710:30:01");
+}
+
+TEST(TradeTape_Text, ReplacedTradesKeepTheirNeighboursWhicheverWayTheyAreKept) {
+  TradeTape tape;
+  for (int n = 1; n <= 100; ++n) tape.Store(kKey, Trade(n, L"2026120710:30:00", std::to_wstring(n) + L".5", L"100", L"1"));
+  // One trade replaced many times over, going between packed and kept-as-it-came text.
+  for (int round = 0; round < 500; ++round) {
+    const std::wstring price = (round % 3 == 0 ? L"\u00A5" : L"") + std::to_wstring(round);
+    tape.Store(kKey, Trade(50, L"2026120710:31:00", price, std::to_wstring(round), L"2"));
+  }
+  // The same trade again, as the live page repeats it, changes nothing.
+  for (int round = 0; round < 100; ++round)
+    tape.StorePage(kKey, L"2026120710:30:00|7.5|100|1||7;2026120710:30:00|8.5|100|1||8");
+  ExpectHeld(tape, Trade(50, L"2026120710:31:00", L"499", L"499", L"2"));
+  for (int n = 1; n <= 100; ++n)
+    if (n != 50) ExpectHeld(tape, Trade(n, L"2026120710:30:00", std::to_wstring(n) + L".5", L"100", L"1"));
+  EXPECT_EQ(tape.Count(kKey), 100u);
+  EXPECT_EQ(tape.CountInPage(kKey, 1), 100);
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <map>
 #include <set>
 
 #include "TapeParsing.h"
@@ -106,6 +107,15 @@ TEST(Market, ReferenceDataCoversProductsExchangesAndAccess) {
       EXPECT_EQ(m.QuoteOf(i).year.size(), 4u);
     }
   }
+  // An exchange and a code find the first listing in market order, twins included.
+  std::map<std::pair<std::string, std::string>, int> firstOn;
+  for (int i = 0; i < int(m.Instruments().size()); ++i)
+    firstOn.emplace(std::make_pair(m.Instruments()[i].exchangeCode, m.Instruments()[i].instrumentCode), i);
+  for (const auto& [key, i] : firstOn) EXPECT_EQ(m.FindOnExchange(key.first, key.second), i) << key.first << ":" << key.second;
+  const auto& first = m.Instruments()[0];
+  EXPECT_EQ(m.FindOnExchange(first.exchangeCode, first.instrumentCode + "X"), -1);
+  EXPECT_EQ(m.FindOnExchange(" " + first.exchangeCode, first.instrumentCode), -1) << "the caller trims";
+  EXPECT_EQ(m.FindOnExchange("NOSUCH", first.instrumentCode), -1);
   EXPECT_GT(keldo, 0);
   EXPECT_GT(hidden, 0);
   EXPECT_GT(viewOnly, 0);
