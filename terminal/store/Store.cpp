@@ -158,9 +158,15 @@ fs::path SetAside(const fs::path& db, const std::string& tag, std::string& error
 }
 
 // What an existing file holds.
-enum class Probe { Ours, Empty, Corrupt, Newer };
+enum class Probe { Ours, Empty, Corrupt, Newer, Busy };
 
-Probe ProbeFile(const fs::path& path, int& version, std::string& detail) {
+// Locked by another program: nothing says the file is damaged.
+bool IsBusy(int code) {
+  code &= 0xFF;
+  return code == SQLITE_BUSY || code == SQLITE_LOCKED;
+}
+
+Probe ProbeFile(const fs::path& path, int busyWaitMs, int& version, std::string& detail) {
   sqlite3* db = nullptr;
   // Read-write so that a hot WAL left by a killed terminal is recovered, as it must be.
   int rc = sqlite3_open_v2(path.c_str(), &db, SQLITE_OPEN_READWRITE, nullptr);
@@ -168,8 +174,16 @@ Probe ProbeFile(const fs::path& path, int& version, std::string& detail) {
   if (rc != SQLITE_OK) {
     detail = sqlite3_errstr(rc);
     close();
-    return Probe::Corrupt;
+    return IsBusy(rc) ? Probe::Busy : Probe::Corrupt;
   }
+  // Another program's write or checkpoint holds the lock for a moment: wait
+  // for it as every later statement does, rather than take the file for damaged.
+  sqlite3_busy_timeout(db, busyWaitMs);
+  auto failed = [&] {
+    const bool busy = IsBusy(sqlite3_extended_errcode(db));
+    close();
+    return busy ? Probe::Busy : Probe::Corrupt;
+  };
   auto scalar = [&](const char* sql, std::int64_t& out) -> bool {
     Stmt s(db, sql);
     if (!s.ok()) { detail = sqlite3_errmsg(db); return false; }
@@ -180,10 +194,8 @@ Probe ProbeFile(const fs::path& path, int& version, std::string& detail) {
   };
   std::int64_t appId = 0, userVersion = 0, tables = 0;
   if (!scalar("PRAGMA application_id", appId) || !scalar("PRAGMA user_version", userVersion) ||
-      !scalar("SELECT count(*) FROM sqlite_schema", tables)) {
-    close();
-    return Probe::Corrupt;
-  }
+      !scalar("SELECT count(*) FROM sqlite_schema", tables))
+    return failed();
   version = static_cast<int>(userVersion);
   if (appId == 0 && userVersion == 0 && tables == 0) { close(); return Probe::Empty; }
   if (appId != kApplicationId) {
@@ -197,8 +209,7 @@ Probe ProbeFile(const fs::path& path, int& version, std::string& detail) {
     if (!check.ok() || check.Step() != SQLITE_ROW || check.Text(0) != "ok") {
       detail = check.ok() ? check.Text(0) : sqlite3_errmsg(db);
       if (detail.empty()) detail = sqlite3_errmsg(db);
-      close();
-      return Probe::Corrupt;
+      return failed();
     }
   }
   close();
@@ -234,7 +245,7 @@ fs::path Store::DefaultDataDir() {
   return fs::path(home && *home ? home : ".") / ".local" / "share" / "marketviews-terminal";
 }
 
-std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report, std::string& error) {
+std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report, std::string& error, int busyWaitMs) {
   report = {};
   std::error_code ec;
   fs::create_directories(dir, ec);
@@ -248,12 +259,16 @@ std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report,
   int version = 0;
   if (fs::exists(path)) {
     std::string detail;
-    switch (ProbeFile(path, version, detail)) {
+    switch (ProbeFile(path, busyWaitMs, version, detail)) {
       case Probe::Ours:
         report.outcome = StoreOpenReport::Outcome::Opened;
         break;
       case Probe::Empty:
         break;
+      case Probe::Busy:
+        error = "the terminal database " + path.string() + " is locked by another program (" + detail +
+                "); nothing was changed. Close the other program and start the terminal again.";
+        return nullptr;
       case Probe::Corrupt: {
         report.setAsidePath = SetAside(path, "corrupt", error);
         if (report.setAsidePath.empty()) return nullptr;
@@ -286,7 +301,7 @@ std::unique_ptr<Store> Store::Open(const fs::path& dir, StoreOpenReport& report,
   std::unique_ptr<Store> store(new Store(db, path));
   // FULL: a commit is on disk before the save returns.
   if (!store->Exec("PRAGMA journal_mode=WAL") || !store->Exec("PRAGMA synchronous=FULL") ||
-      !store->Exec("PRAGMA busy_timeout=5000")) {
+      !store->Exec(("PRAGMA busy_timeout=" + std::to_string(busyWaitMs)).c_str())) {
     error = "cannot prepare " + path.string() + ": " + store->m_error;
     return nullptr;
   }

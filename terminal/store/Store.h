@@ -101,9 +101,10 @@ class Store {
   static std::filesystem::path DefaultDataDir();
 
   // Opens (creating the folder and database as needed) <dir>/terminal.db.
-  // Null with `error` set when the folder or a fresh database cannot be made.
+  // Null with `error` set when the folder or a fresh database cannot be made,
+  // or when another program keeps the database locked past `busyWaitMs`.
   static std::unique_ptr<Store> Open(const std::filesystem::path& dir, StoreOpenReport& report,
-                                     std::string& error);
+                                     std::string& error, int busyWaitMs = 5000);
   ~Store();
   Store(const Store&) = delete;
   Store& operator=(const Store&) = delete;

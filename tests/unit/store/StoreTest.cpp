@@ -314,6 +314,36 @@ TEST(Store, Open_UnusableFolderIsAnError) {
   EXPECT_NE(error.find("data folder"), std::string::npos) << error;
 }
 
+// A database another program holds locked is left alone: the terminal does
+// not start, and nothing is set aside for damaged.
+TEST(Store, Open_DatabaseLockedByAnotherProgramIsRefusedAndKept) {
+  TempDir dir;
+  {
+    StoreOpenReport report;
+    auto store = OpenOk(dir.path, report);
+    ASSERT_TRUE(store->SaveSettings({{"kept", "1"}}));
+  }
+  sqlite3* other = nullptr;
+  ASSERT_EQ(sqlite3_open((dir.path / Store::kFileName).c_str(), &other), SQLITE_OK);
+  ASSERT_EQ(sqlite3_exec(other, "PRAGMA locking_mode=EXCLUSIVE; BEGIN EXCLUSIVE; CREATE TABLE hold(x);", nullptr,
+                         nullptr, nullptr),
+            SQLITE_OK);
+  StoreOpenReport report;
+  std::string error;
+  EXPECT_FALSE(Store::Open(dir.path, report, error, 0));
+  EXPECT_NE(error.find("locked by another program"), std::string::npos) << error;
+  EXPECT_TRUE(report.setAsidePath.empty());
+  std::size_t files = 0;
+  for ([[maybe_unused]] const auto& entry : fs::directory_iterator(dir.path)) ++files;
+  EXPECT_LE(files, 3u) << "the database and its -wal and -shm, nothing moved aside";
+
+  ASSERT_EQ(sqlite3_exec(other, "ROLLBACK", nullptr, nullptr, nullptr), SQLITE_OK);
+  sqlite3_close(other);
+  auto again = OpenOk(dir.path, report);
+  EXPECT_EQ(report.outcome, Outcome::Opened);
+  EXPECT_EQ(again->LoadSettings().count("kept"), 1u);
+}
+
 TEST(Store, DefaultDataDir_FollowsXdgDataHome) {
   setenv("XDG_DATA_HOME", "/tmp/xdg-here", 1);
   EXPECT_EQ(Store::DefaultDataDir(), fs::path("/tmp/xdg-here/marketviews-terminal"));
