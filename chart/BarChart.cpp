@@ -265,33 +265,51 @@ std::vector<int> CBarChart::DrawnGroups() const {
 }
 
 void CBarChart::Rebuild() {
-  m_bars->clear();  // deletes the old sets
   const auto visible = DrawnGroups();
+  // The sets are kept and their values changed in place: replacing the sets
+  // on every redraw leaves bar items behind in the chart (memory grows with
+  // every update of a chart that is shown all day) and costs a relayout.
+  QList<QBarSet*> sets = m_bars->barSets();
+  bool sameSets = sets.size() == SeriesCount();
+  for (int s = 0; sameSets && s < SeriesCount(); ++s) sameSets = sets[s]->label() == m_series[std::size_t(s)].legend;
+  if (!sameSets) {
+    m_bars->clear();  // deletes the old sets
+    sets.clear();
+    for (int s = 0; s < SeriesCount(); ++s) {
+      auto* set = new QBarSet(m_series[std::size_t(s)].legend);
+      m_bars->append(set);
+      sets << set;
+    }
+  }
   double top = 0.0;
-  QStringList labels;
-  for (int g : visible) labels << m_groups[std::size_t(g)].label;
+  const int count = int(visible.size());
   for (int s = 0; s < SeriesCount(); ++s) {
-    auto* set = new QBarSet(m_series[std::size_t(s)].legend);
+    QBarSet* set = sets[s];
     const COLORREF c = m_series[std::size_t(s)].color;
     const QColor color(int(ColorRefRed(c)), int(ColorRefGreen(c)), int(ColorRefBlue(c)));
-    set->setColor(color);
-    set->setBorderColor(color.darker(115));
-    for (int g : visible) {
-      const auto& values = m_groups[std::size_t(g)].values;
+    if (set->color() != color) set->setColor(color);
+    if (set->borderColor() != color.darker(115)) set->setBorderColor(color.darker(115));
+    if (set->count() > count) set->remove(count, set->count() - count);
+    for (int i = 0; i < count; ++i) {
+      const auto& values = m_groups[std::size_t(visible[std::size_t(i)])].values;
       const double v = std::size_t(s) < values.size() && std::isfinite(values[std::size_t(s)]) ? values[std::size_t(s)] : 0.0;
-      *set << v;
+      if (i >= set->count()) set->append(v);
+      else if (set->at(i) != v) set->replace(i, v);
       top = std::max(top, v);
     }
-    m_bars->append(set);
   }
-  m_axisX->clear();
   // Category texts must be unique: repeated labels get invisible padding.
   QStringList unique;
-  for (QString l : labels) {
+  for (int g : visible) {
+    QString l = m_groups[std::size_t(g)].label;
     while (unique.contains(l)) l += QChar(0x200B);
     unique << l;
   }
-  m_axisX->append(unique.isEmpty() ? QStringList{QString()} : unique);
+  if (unique.isEmpty()) unique << QString();
+  if (m_axisX->categories() != unique) {
+    m_axisX->clear();
+    m_axisX->append(unique);
+  }
   double max = top > m_min ? m_min + (top - m_min) * (1.0 + m_headroom / 100.0) : m_min + 1.0;
   m_axisY->setRange(m_min, max);
   m_axisY->setTickCount(m_ticks);

@@ -1250,8 +1250,10 @@ std::vector<DepthLevel> Market::Book(int index, int levels) {
 }
 
 std::size_t Market::TapeBytes() const {
-  std::size_t bytes = d->tapes.capacity() * sizeof(std::vector<Trade>);
-  for (const auto& tape : d->tapes) bytes += tape.capacity() * sizeof(Trade);
+  // Trades held, not capacity: a tape's vector doubles at once, but the pages
+  // past its last trade are not resident until trades reach them.
+  std::size_t bytes = d->tapes.size() * sizeof(std::vector<Trade>);
+  for (const auto& tape : d->tapes) bytes += tape.size() * sizeof(Trade);
   return bytes;
 }
 

@@ -112,8 +112,8 @@ class Market {
   const std::vector<JProduct>& Products() const;
   const std::vector<JExchangeList>& Exchanges() const;
   const std::vector<JInstrumentUnderlying>& Instruments() const;
-  // The bytes the day's trade tapes hold (they grow with every trade: the
-  // simulated exchange keeps the day), for memory figures.
+  // The bytes of the trades the day's tapes hold (they grow with every trade:
+  // the simulated exchange keeps the day), for memory figures.
   std::size_t TapeBytes() const;
   const std::vector<TickBand>& TickBands() const;
   const std::vector<JSector>& Sectors() const;
