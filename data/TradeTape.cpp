@@ -123,13 +123,15 @@ std::array<std::wstring*, kFields> FieldsOf(TradeRecord& t) { return {&t.time, &
 
 }  // namespace
 
-bool TradeTape::Packs(const TradeRecord& trade) {
+bool TradeTape::Packs(const Block& block, const TradeRecord& trade) {
+  std::size_t length = 0;
   for (const std::wstring* field : FieldsOf(trade)) {
     if (field->size() > 255) return false;
     for (const wchar_t c : *field)
       if (c < 0 || c > 0x7F) return false;
+    length += field->size();
   }
-  return true;
+  return block.text.size() + length <= 0xFFFF;
 }
 
 bool TradeTape::SameAsPacked(const Block& block, int slot, const TradeRecord& trade) {
@@ -137,7 +139,14 @@ bool TradeTape::SameAsPacked(const Block& block, int slot, const TradeRecord& tr
   std::size_t at = s.at;
   const auto fields = FieldsOf(trade);
   for (std::size_t f = 0; f < kFields; ++f) {
-    const std::wstring& field = *fields[f];
+    std::wstring_view field = *fields[f];
+    if (f == 0 && block.prefixed[std::size_t(slot)]) {
+      const std::string& prefix = block.timePrefix;
+      if (field.size() < prefix.size() || !std::equal(prefix.begin(), prefix.end(), field.begin(),
+                                                      [](char a, wchar_t b) { return static_cast<wchar_t>(a) == b; }))
+        return false;
+      field.remove_prefix(prefix.size());
+    }
     if (field.size() != s.length[f]) return false;
     for (const wchar_t c : field)
       if (static_cast<unsigned char>(block.text[at++]) != static_cast<unsigned>(c)) return false;
@@ -145,10 +154,10 @@ bool TradeTape::SameAsPacked(const Block& block, int slot, const TradeRecord& tr
   return true;
 }
 
-// Drops the text of replaced trades.
+// Keeps only the text of the held packed trades.
 void TradeTape::Repack(Block& block) {
   std::string text;
-  text.reserve(block.text.size() - block.stale);
+  text.reserve(block.text.size());
   for (int i = 0; i < mvd::kTradesPerPage; ++i) {
     Slot& s = block.places[std::size_t(i)];
     if (!block.held[std::size_t(i)] || block.unpacked.count(i)) continue;
@@ -156,10 +165,9 @@ void TradeTape::Repack(Block& block) {
     for (const std::uint8_t l : s.length) length += l;
     const std::size_t at = text.size();
     text.append(block.text, s.at, length);
-    s.at = static_cast<std::uint32_t>(at);
+    s.at = static_cast<std::uint16_t>(at);
   }
   block.text = std::move(text);
-  block.stale = 0;
 }
 
 bool TradeTape::StoreLocked(Tape& tape, TradeRecord&& trade) {
@@ -182,21 +190,34 @@ bool TradeTape::StoreLocked(Tape& tape, TradeRecord&& trade) {
     ++tape.count;
   }
   Slot& s = block.places[std::size_t(slot)];
-  if (wasPacked)
-    for (const std::uint8_t l : s.length) block.stale += l;
+  if (wasPacked) {
+    // A replaced trade's text goes at once, so the block's text only holds live trades.
+    block.held[std::size_t(slot)] = false;
+    Repack(block);
+    block.held[std::size_t(slot)] = true;
+  }
 
-  if (!Packs(trade)) {
+  if (!Packs(block, trade)) {
     block.unpacked[slot] = std::move(trade);
   } else {
     if (unpacked != block.unpacked.end()) block.unpacked.erase(unpacked);
-    s.at = static_cast<std::uint32_t>(block.text.size());
+    // Times start with the date and hour: the block writes them once.
+    constexpr std::size_t kPrefix = 10;
+    if (block.timePrefix.empty() && trade.time.size() >= kPrefix)
+      block.timePrefix.assign(trade.time.begin(), trade.time.begin() + kPrefix);
+    const std::string& prefix = block.timePrefix;
+    const bool prefixed = !prefix.empty() && trade.time.size() >= prefix.size() &&
+                          std::equal(prefix.begin(), prefix.end(), trade.time.begin(),
+                                     [](char a, wchar_t b) { return static_cast<wchar_t>(a) == b; });
+    block.prefixed[std::size_t(slot)] = prefixed;
+    s.at = static_cast<std::uint16_t>(block.text.size());
     const auto fields = FieldsOf(trade);
     for (std::size_t f = 0; f < kFields; ++f) {
-      s.length[f] = static_cast<std::uint8_t>(fields[f]->size());
-      for (const wchar_t c : *fields[f]) block.text.push_back(static_cast<char>(c));
+      const std::size_t skip = f == 0 && prefixed ? prefix.size() : 0;
+      s.length[f] = static_cast<std::uint8_t>(fields[f]->size() - skip);
+      for (std::size_t k = skip; k < fields[f]->size(); ++k) block.text.push_back(static_cast<char>((*fields[f])[k]));
     }
   }
-  if (block.stale > 0 && block.stale * 2 > block.text.size()) Repack(block);
   // A whole page seldom changes again: give back what growing the text reserved.
   if (block.count == mvd::kTradesPerPage && block.text.capacity() > block.text.size() + 64) block.text.shrink_to_fit();
   return true;
@@ -240,7 +261,12 @@ const TradeRecord* TradeTape::FindLocked(const InstrumentKey& key, std::int32_t 
   const auto fields = FieldsOf(scratch_);
   for (std::size_t f = 0; f < kFields; ++f) {
     const auto* begin = reinterpret_cast<const unsigned char*>(block->text.data()) + at;
-    fields[f]->assign(begin, begin + s.length[f]);
+    if (f == 0 && block->prefixed[std::size_t(slot)]) {
+      fields[f]->assign(block->timePrefix.begin(), block->timePrefix.end());
+      fields[f]->append(begin, begin + s.length[f]);
+    } else {
+      fields[f]->assign(begin, begin + s.length[f]);
+    }
     at += s.length[f];
   }
   scratch_.number = number;

@@ -65,7 +65,7 @@ std::string FilePart(const std::string& code) {
 }  // namespace
 
 std::string TapeTsv(sim::Market& market, int index, const SideWords& words) {
-  const std::vector<sim::Trade>& trades = market.Trades(index);
+  const sim::Tape& trades = market.Trades(index);
   std::string out = "trade\ttime\tprice\tvolume\tside\n";
   out.reserve(out.size() + trades.size() * 40);
   for (std::size_t k = trades.size(); k-- > 0;) {

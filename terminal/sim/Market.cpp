@@ -7,6 +7,7 @@
 #include <cstdio>
 #include <limits>
 #include <map>
+#include <memory>
 #include <numeric>
 #include <unordered_map>
 #include <unordered_set>
@@ -278,7 +279,7 @@ struct Market::Impl {
   std::vector<JInstrumentUnderlying> instruments;
   std::vector<InstInfo> info;
   std::vector<State> state;
-  std::vector<std::vector<Trade>> tapes;
+  std::vector<std::unique_ptr<Tape>> tapes;  // made when an instrument is first watched
   std::vector<TickBand> bands;
   std::vector<JSector> sectors;
   std::vector<JRemarkMessage> remarks;
@@ -359,12 +360,13 @@ struct Market::Impl {
   // One trade move of the walk: the new price and side from the current state.
   Trade NextTrade(int i, State& s, Rng& r, std::uint32_t timeMs) const;
   void ApplyTrade(int i, State& s, const Trade& t, Rng& r) const;
-  void History(int i, State& s, std::vector<Trade>* tape) const;
+  void History(int i, State& s, Tape* tape) const;
   void Materialize(int i) {
     State& s = state[i];
     if (s.materialized) return;
     State scratch;
-    History(i, scratch, &tapes[i]);
+    if (!tapes[i]) tapes[i] = std::make_unique<Tape>();
+    History(i, scratch, tapes[i].get());
     s.materialized = true;
   }
   void Event(int i, Rng& r);
@@ -649,7 +651,8 @@ void Market::Impl::Build() {
     maxActivity = std::max(maxActivity, info[i].activity);
   }
   state.assign(n, State{});
-  tapes.assign(n, {});
+  tapes.clear();
+  tapes.resize(n);
   interest.assign(n, 0);
   dirty.assign(n, 0);
   priceWatch.assign(n, 0);
@@ -758,7 +761,7 @@ void Market::Impl::ApplyTrade(int i, State& s, const Trade& t, Rng& r) const {
   s.askVol = std::int64_t(inf.lot) * r.Range(1, 300);
 }
 
-void Market::Impl::History(int i, State& s, std::vector<Trade>* tape) const {
+void Market::Impl::History(int i, State& s, Tape* tape) const {
   const InstInfo& inf = info[i];
   Rng r(StreamSeed(config.seed, std::uint64_t(i), 0x7A9E));
   s = State{};
@@ -766,7 +769,7 @@ void Market::Impl::History(int i, State& s, std::vector<Trade>* tape) const {
   const double spanMs = startMs > openMs ? double(startMs - openMs) : 0.0;
   int count = int(inf.activity * 0.5 * spanMs / 1000.0 * 0.12 * historyScale);
   if (spanMs > 0 && count < 1 && r.Chance(0.7)) count = 1;
-  if (tape) { tape->clear(); tape->reserve(std::size_t(count) + 64); }
+  if (tape) tape->clear();
   if (count > 0) {
     // Opening auction.
     Trade open;
@@ -856,7 +859,7 @@ void Market::Impl::Event(int i, Rng& r) {
     // An index ticks: a new value, no book.
     Trade t = NextTrade(i, s, r, TimeOfDay());
     ApplyTrade(i, s, t, r);
-    tapes[i].push_back(t);
+    tapes[i]->push_back(t);
     MarkDirty(i, kTradeChanged | (inf.index ? 0u : std::uint32_t(kBookChanged)));
     if (priceWatch[i] > 0 && priceListener) priceListener(i);
     return;
@@ -910,7 +913,7 @@ void Market::Impl::Event(int i, Rng& r) {
       best.orders = std::int32_t(std::clamp<std::int64_t>(best.orders - 1, 1, best.size / lot));
     }
     RecordTrade(s, t);
-    tapes[i].push_back(t);
+    tapes[i]->push_back(t);
     bits |= kTradeChanged;
   } else if (u < 0.39 && !book.bids.empty()) {
     // A new order inside the spread, on the side the market leans to.
@@ -1250,25 +1253,29 @@ std::vector<DepthLevel> Market::Book(int index, int levels) {
 }
 
 std::size_t Market::TapeBytes() const {
-  // Trades held, not capacity: a tape's vector doubles at once, but the pages
-  // past its last trade are not resident until trades reach them.
-  std::size_t bytes = d->tapes.size() * sizeof(std::vector<Trade>);
-  for (const auto& tape : d->tapes) bytes += tape.size() * sizeof(Trade);
+  // The chunks the tapes hold (libstdc++ makes them 512 bytes) and their maps.
+  constexpr std::size_t kChunk = 512, kPerChunk = kChunk / sizeof(Trade);
+  std::size_t bytes = d->tapes.capacity() * sizeof(std::unique_ptr<Tape>);
+  for (const auto& tape : d->tapes) {
+    if (!tape) continue;
+    const std::size_t chunks = tape->size() / kPerChunk + 1;
+    bytes += sizeof(Tape) + chunks * kChunk + (chunks + 2) * sizeof(void*);
+  }
   return bytes;
 }
 
-const std::vector<Trade>& Market::Trades(int index) {
-  static const std::vector<Trade> none;
+const Tape& Market::Trades(int index) {
+  static const Tape none;
   if (index < 0 || index >= int(d->instruments.size())) return none;
   const int b = d->Base(index);
   d->Materialize(b);
-  return d->tapes[b];
+  return *d->tapes[b];
 }
 
 std::vector<SummaryLine> Market::Summary(int index) {
   if (index < 0 || index >= int(d->instruments.size())) return {};
   const int b = d->Base(index);
-  const std::vector<Trade>& tape = Trades(b);
+  const Tape& tape = Trades(b);
   auto& cache = d->summaries[b];
   if (cache.first == std::int32_t(tape.size()) && !cache.second.empty()) return cache.second;
   const double scale = std::pow(10.0, d->info[b].decimals);
@@ -1298,7 +1305,7 @@ int Market::TradePageCount(int index) {
 }
 
 std::string Market::TradePageText(int index, int page) {
-  const std::vector<Trade>& tape = Trades(index);
+  const Tape& tape = Trades(index);
   const int n = int(tape.size());
   int first = 0, last = -1;  // trade numbers, inclusive
   if (page == kLivePage) {

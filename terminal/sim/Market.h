@@ -18,6 +18,7 @@
 //
 // Plain C++, no Qt, single-threaded.
 #include <cstdint>
+#include <deque>
 #include <functional>
 #include <memory>
 #include <string>
@@ -50,6 +51,10 @@ struct Trade {
   double price = 0.0;
   std::uint8_t side = 1;     // 0 married deal, 1 at the ask (buy), 2 at the bid (sell), 3 auction
 };
+
+// An instrument's trades of the day, oldest first. Grown in fixed chunks, so a
+// long tape never needs a second copy of itself while it grows.
+using Tape = std::deque<Trade>;
 
 // One line of the trade summary (traded volume at one price).
 struct SummaryLine {
@@ -177,7 +182,7 @@ class Market {
   DepthLevel Depth(int index, int level);   // level 1..99
   // Levels 1..`levels` in one pass (what a depth subscription reads).
   std::vector<DepthLevel> Book(int index, int levels);
-  const std::vector<Trade>& Trades(int index);
+  const Tape& Trades(int index);
   std::vector<SummaryLine> Summary(int index);  // by price, highest first
 
   // The current name of an instrument (the reference record's until it changed).

@@ -145,4 +145,39 @@ TEST(TradeTape_Text, ReplacedTradesKeepTheirNeighboursWhicheverWayTheyAreKept) {
   EXPECT_EQ(tape.CountInPage(kKey, 1), 100);
 }
 
+TEST(TradeTape_Text, TimesOfOtherDaysAndHoursAndFullBlocksComeBackWhole) {
+  TradeTape tape;
+  std::vector<TradeRecord> trades = {
+      Trade(1, L"09:59:59", L"1", L"1", L"1"),                    // shorter than a date and hour
+      Trade(2, L"2026120710:00:00", L"1", L"1", L"1"),            // sets the block's date and hour
+      Trade(3, L"2026120710", L"1", L"1", L"1"),                  // only the date and hour
+      Trade(4, L"2026120711:00:00", L"1", L"1", L"1"),            // the next hour
+      Trade(5, L"2026120810:00:00", L"1", L"1", L"1"),            // the next day
+      Trade(6, L"2026120710:00:01", L"1", L"1", L"1"),
+      Trade(7, L"202612071", L"1", L"1", L"1"),                   // a prefix of the prefix
+  };
+  for (const TradeRecord& t : trades) tape.Store(kKey, t);
+  for (const TradeRecord& t : trades) ExpectHeld(tape, t);
+  // Re-sent as the live page does, and replaced with other days' times.
+  for (const TradeRecord& t : trades) tape.Store(kKey, t);
+  tape.Store(kKey, Trade(2, L"2026120909:00:00", L"2", L"2", L"2"));
+  trades[1] = Trade(2, L"2026120909:00:00", L"2", L"2", L"2");
+  for (const TradeRecord& t : trades) ExpectHeld(tape, t);
+
+  // A page of the longest fields packs what fits and keeps the rest as it came.
+  TradeTape full;
+  std::vector<TradeRecord> longest;
+  for (int n = 101; n <= 200; ++n)
+    longest.push_back(Trade(n, std::wstring(255, wchar_t(L'a' + n % 26)), std::wstring(255, L'1'),
+                            std::wstring(255, L'2'), std::to_wstring(n)));
+  for (const TradeRecord& t : longest) full.Store(kKey, t);
+  for (const TradeRecord& t : longest) {
+    TradeRecord got;
+    ASSERT_TRUE(full.Get(kKey, t.number, got));
+    EXPECT_EQ(got.time, t.time);
+    EXPECT_EQ(got.side, t.side);
+  }
+  EXPECT_EQ(full.CountInPage(kKey, 2), 100);
+}
+
 }  // namespace
