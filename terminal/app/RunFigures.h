@@ -66,8 +66,9 @@ class LatencyRecorder {
 // every turn of the event loop.
 class SoakFigures {
  public:
-  // `marketKb`: what the simulated exchange's own day tapes hold then.
-  void SampleRss(double simulatedSeconds, std::int64_t rssKb, std::int64_t marketKb = 0);
+  // `marketKb`: what the simulated exchange's own day tapes hold then;
+  // `heapKb`: the bytes the allocator has handed out and not had back (-1: unknown).
+  void SampleRss(double simulatedSeconds, std::int64_t rssKb, std::int64_t marketKb = 0, std::int64_t heapKb = -1);
   // One turn: everything the event loop ran for one step of simulated time.
   void Turn(std::int64_t wallUs, std::int64_t cpuUs);
   // The values pushed to the views over the run (410s), for the report.
@@ -78,8 +79,9 @@ class SoakFigures {
   // Least-squares slope of the samples taken at or after `warmupSeconds`, in
   // MB (1024 kB) per simulated hour; 0 with fewer than two samples.
   double RssGrowthMbPerHour(double warmupSeconds) const;
-  // The same for the simulated exchange's tapes.
+  // The same for the simulated exchange's tapes, and for the heap in use.
   double MarketGrowthMbPerHour(double warmupSeconds) const;
+  double HeapGrowthMbPerHour(double warmupSeconds) const;
   const DurationStats& TurnWall() const { return m_wall; }
   const DurationStats& TurnCpu() const { return m_cpu; }
   const std::vector<std::pair<double, std::int64_t>>& Samples() const { return m_samples; }
@@ -89,6 +91,7 @@ class SoakFigures {
  private:
   std::vector<std::pair<double, std::int64_t>> m_samples;
   std::vector<std::pair<double, std::int64_t>> m_market;
+  std::vector<std::pair<double, std::int64_t>> m_heap;
   DurationStats m_wall, m_cpu;
   std::uint64_t m_pushes = 0;
   std::uint64_t m_subscriptions = 0;
@@ -97,5 +100,8 @@ class SoakFigures {
 
 // The resident set size of this process in kB (VmRSS); -1 when unknown.
 std::int64_t ReadRssKb();
+// The heap this process uses in kB: what malloc has handed out and not had
+// back, without the free memory it keeps.
+std::int64_t ReadHeapKb();
 
 }  // namespace term

@@ -621,7 +621,7 @@ int TerminalApp::RunTimed() {
            std::to_string(m_window->Docks().size()) + " views");
   if (!m_options.soakReport.empty()) {
     m_soak = std::make_unique<SoakFigures>();
-    m_soak->SampleRss(0, ReadRssKb(), static_cast<std::int64_t>(m_runtime->Market().TapeBytes() / 1024));
+    m_soak->SampleRss(0, ReadRssKb(), static_cast<std::int64_t>(m_runtime->Market().TapeBytes() / 1024), ReadHeapKb());
   }
   const long long sampleEvery = static_cast<long long>(kSoakSampleSeconds * 1000 / kPumpMs);
   for (long long i = 0; i < steps && !m_shutDown && !m_stopRequested; ++i) {
@@ -635,7 +635,7 @@ int TerminalApp::RunTimed() {
       m_soak->Turn(WallUs() - wall0, ThreadCpuUs() - cpu0);
       if ((i + 1) % sampleEvery == 0)
         m_soak->SampleRss(static_cast<double>(i + 1) * kPumpMs / 1000.0, ReadRssKb(),
-                          static_cast<std::int64_t>(m_runtime->Market().TapeBytes() / 1024));
+                          static_cast<std::int64_t>(m_runtime->Market().TapeBytes() / 1024), ReadHeapKb());
     }
     if (m_options.saveChurn && !ChurnStep()) return 1;
   }

@@ -96,9 +96,11 @@ TEST(SoakFigures, GrowthIsTheSlopeAfterTheWarmUpAndTheReportNamesEveryFigure) {
   for (int minute = 10; minute <= 60; ++minute) {
     const double hours = minute / 60.0;
     const auto kb = static_cast<std::int64_t>(200'000 + hours * 2048) + (minute % 2 ? 4 : -4);
-    s.SampleRss(minute * 60.0, kb);
+    // The heap in use grows by 1 MB an hour, the exchange's tapes by half of that.
+    s.SampleRss(minute * 60.0, kb, static_cast<std::int64_t>(hours * 512), static_cast<std::int64_t>(90'000 + hours * 1024));
   }
   EXPECT_NEAR(s.RssGrowthMbPerHour(600), 2.0, 0.05);
+  EXPECT_NEAR(s.HeapGrowthMbPerHour(600), 1.0, 0.01);
   EXPECT_GT(s.RssGrowthMbPerHour(0), 10.0);  // with the warm-up it would read as a leak
 
   s.Turn(1'000, 800);
@@ -106,13 +108,16 @@ TEST(SoakFigures, GrowthIsTheSlopeAfterTheWarmUpAndTheReportNamesEveryFigure) {
   s.SetPushes(7200, 3600);
   const std::string report = s.Report(600, 50);
   for (const char* key : {"rss_growth_mb_per_hour\t", "pushes\t7200\t(2 a second)", "turns\t2\t",
-                          "turn_wall_ms_worst\t42.0", "turn_cpu_ms_worst\t30.0", "rss_kb\t3600\t"})
+                          "turn_wall_ms_worst\t42.0", "turn_cpu_ms_worst\t30.0", "rss_kb\t3600\t",
+                          "rss_growth_without_market_tapes_mb_per_hour\t1.50", "heap_growth_mb_per_hour\t1.00",
+                          "heap_growth_without_market_tapes_mb_per_hour\t0.50"})
     EXPECT_NE(report.find(key), std::string::npos) << key << "\n" << report;
 }
 
 TEST(ReadRssKb, ReadsThisProcesssResidentMemory) {
   const std::int64_t kb = ReadRssKb();
   EXPECT_GT(kb, 100);  // a running test binary holds more than 100 kB
+  EXPECT_GE(ReadHeapKb(), 0);
 }
 
 }  // namespace
