@@ -257,16 +257,15 @@ const TradeRecord* TradeTape::FindLocked(const InstrumentKey& key, std::int32_t 
   if (const auto unpacked = block->unpacked.find(slot); unpacked != block->unpacked.end()) return &unpacked->second;
   // Unpacked into one record kept for the purpose: assign() reuses its strings' room.
   const Slot& s = block->places[std::size_t(slot)];
-  std::size_t at = s.at;
+  const char* at = block->text.data() + s.at;
   const auto fields = FieldsOf(scratch_);
   for (std::size_t f = 0; f < kFields; ++f) {
-    const auto* begin = reinterpret_cast<const unsigned char*>(block->text.data()) + at;
-    if (f == 0 && block->prefixed[std::size_t(slot)]) {
-      fields[f]->assign(block->timePrefix.begin(), block->timePrefix.end());
-      fields[f]->append(begin, begin + s.length[f]);
-    } else {
-      fields[f]->assign(begin, begin + s.length[f]);
-    }
+    // Widened in place: the record's strings keep their room from one read to the next.
+    std::wstring& field = *fields[f];
+    const std::size_t prefix = f == 0 && block->prefixed[std::size_t(slot)] ? block->timePrefix.size() : 0;
+    field.resize(prefix + s.length[f]);
+    for (std::size_t k = 0; k < prefix; ++k) field[k] = static_cast<unsigned char>(block->timePrefix[k]);
+    for (std::size_t k = 0; k < s.length[f]; ++k) field[prefix + k] = static_cast<unsigned char>(at[k]);
     at += s.length[f];
   }
   scratch_.number = number;
