@@ -279,6 +279,9 @@ struct Market::Impl {
   std::vector<JInstrumentUnderlying> instruments;
   std::vector<InstInfo> info;
   std::vector<State> state;
+  // The tapes' chunks come from large blocks of their own, so a day of trades
+  // leaves no free gaps between the heap's other allocations.
+  std::pmr::unsynchronized_pool_resource tapeMemory{std::pmr::pool_options{4096, 512}};
   std::vector<std::unique_ptr<Tape>> tapes;  // made when an instrument is first watched
   std::vector<TickBand> bands;
   std::vector<JSector> sectors;
@@ -365,7 +368,7 @@ struct Market::Impl {
     State& s = state[i];
     if (s.materialized) return;
     State scratch;
-    if (!tapes[i]) tapes[i] = std::make_unique<Tape>();
+    if (!tapes[i]) tapes[i] = std::make_unique<Tape>(&tapeMemory);
     History(i, scratch, tapes[i].get());
     s.materialized = true;
   }

@@ -19,6 +19,7 @@
 // Plain C++, no Qt, single-threaded.
 #include <cstdint>
 #include <deque>
+#include <memory_resource>
 #include <functional>
 #include <memory>
 #include <string>
@@ -54,7 +55,7 @@ struct Trade {
 
 // An instrument's trades of the day, oldest first. Grown in fixed chunks, so a
 // long tape never needs a second copy of itself while it grows.
-using Tape = std::deque<Trade>;
+using Tape = std::pmr::deque<Trade>;
 
 // One line of the trade summary (traded volume at one price).
 struct SummaryLine {
