@@ -7,12 +7,14 @@
 // line "RATIO <name> <store/baseline>" per comparison.
 // bench-links: mv_data
 #include <benchmark/benchmark.h>
+#include <malloc.h>
 
 #include <algorithm>
 #include <array>
 #include <charconv>
 #include <cstdio>
 #include <map>
+#include <memory>
 #include <random>
 #include <string>
 #include <unordered_map>
@@ -21,6 +23,7 @@
 #include "data/MarketStores.h"
 #include "data/QuoteStore.h"
 #include "data/ReferenceStores.h"
+#include "data/TradeTape.h"
 #include "hostview/Text.h"
 
 namespace {
@@ -435,6 +438,55 @@ BENCHMARK(BM_TapeRecount_Baseline)->Unit(benchmark::kMicrosecond);
 BENCHMARK(BM_TapeRecount_Copies)->Unit(benchmark::kMicrosecond);
 BENCHMARK(BM_TapeRecount_Unchanged);
 
+// A busy stock's day as the live page brings it: "TRADEDATA" items of trades
+// numbered `from`..`to`, newest first.
+std::wstring TradeItems(int from, int to) {
+  std::wstring text;
+  for (int n = to; n >= from; --n) {
+    if (!text.empty()) text += L';';
+    const int second = n / 3;
+    wchar_t time[32];
+    std::swprintf(time, 32, L"20261207%02d:%02d:%02d", 9 + second / 3600 % 8, second / 60 % 60, second % 60);
+    text += time + (L"|" + std::to_wstring(7 + n % 30 / 100.0).substr(0, 5) + L"|" + std::to_wstring(100 * (1 + n % 37)) +
+                    L"|" + std::to_wstring(n % 4) + L"||" + std::to_wstring(n));
+  }
+  return text;
+}
+
+// The live page arrives with every push and holds the newest hundred trades,
+// nearly all of them held already: what storing it costs.
+void BM_TradeTapeLivePage(benchmark::State& state) {
+  TradeTape tape;
+  const InstrumentKey key{3, L"LIVE"};
+  tape.StorePage(key, TradeItems(1, 20000));
+  const std::wstring live = TradeItems(19901, 20000);
+  for (auto _ : state) benchmark::DoNotOptimize(tape.StorePage(key, live));
+  state.SetItemsProcessed(state.iterations() * 100);
+}
+BENCHMARK(BM_TradeTapeLivePage);
+
+std::size_t HeapInUse() {
+  const struct mallinfo2 m = mallinfo2();
+  return m.uordblks + m.hblkhd;
+}
+
+// The heap a day of trades takes in the tape, and as records of four wide
+// strings each (how the tape kept them before it packed them).
+std::pair<double, double> TradeTapeBytesPerTrade() {
+  constexpr int kTrades = 50000;
+  const std::wstring day = TradeItems(1, kTrades);
+  std::vector<TradeRecord> parsed;
+  mvd::ParseTradeData(day, [&](TradeRecord&& r) { parsed.push_back(std::move(r)); });
+  std::size_t before = HeapInUse();
+  auto tape = std::make_unique<TradeTape>();
+  for (const TradeRecord& r : parsed) tape->Store(InstrumentKey{3, L"DAY"}, r);
+  const double packed = double(HeapInUse() - before) / kTrades;
+  before = HeapInUse();
+  auto records = std::make_unique<std::vector<TradeRecord>>(parsed);
+  const double plain = double(HeapInUse() - before) / kTrades;
+  return {packed, plain};
+}
+
 // Keeps each benchmark's CPU time per iteration (in nanoseconds) for the summary:
 // on a shared machine CPU time is steadier than wall time.
 class Collector : public benchmark::ConsoleReporter {
@@ -496,6 +548,9 @@ int main(int argc, char** argv) {
               get("BM_InstrumentFindAll_Pointer") / 1e6);
   std::printf("quote record copy (Get): %.0f ns; recount over %d pages: %.1f us (with a copy per page %.1f us)\n",
               get("BM_QuoteGet_Store"), kPages, get("BM_TapeRecount_Store") / 1e3, get("BM_TapeRecount_Copies") / 1e3);
+  const auto [packed, plain] = TradeTapeBytesPerTrade();
+  std::printf("trade tape: %.0f bytes a trade (as records of four wide strings: %.0f); live page of 100 stored in %.1f us\n",
+              packed, plain, get("BM_TradeTapeLivePage") / 1e3);
   const std::pair<const char*, const char*> pairs[] = {
       {"quote_update", "BM_QuoteUpdate"}, {"quote_get", "BM_QuoteGet"}, {"instrument_fill", "BM_InstrumentFill"},
       {"instrument_find", "BM_InstrumentFindAll"}, {"tape_recount", "BM_TapeRecount"}};
