@@ -374,15 +374,20 @@ void TerminalApp::DeliverLink(CSuperBaseView* view, std::int64_t productId, cons
 void TerminalApp::LinkInstrument(std::int64_t productId, const std::string& code, CSuperBaseView* from) {
   // The add-on's single-instrument views decide themselves whether they follow.
   m_runtime->LinkInstrument(productId, code);
-  // The terminal's chart, analytics and news follow.
-  const std::wstring text = hv::Widen("{\"type\":\"instrument view\",\"data\":[{\"Field_product_id\":\"" +
-                                      std::to_string(productId) + "\",\"Field_instrument_code\":\"" +
-                                      JsonEscape(code) + "\"}]}");
+  InstrumentLinked(hv::Widen("{\"type\":\"instrument view\",\"data\":[{\"Field_product_id\":\"" +
+                             std::to_string(productId) + "\",\"Field_instrument_code\":\"" + JsonEscape(code) +
+                             "\"}]}"),
+                   from);
+}
+
+void TerminalApp::InstrumentLinked(const std::wstring& linkText, CSuperBaseView* requester) {
+  // The terminal's chart, analytics and news follow; a ticket never changes
+  // instrument under the user.
   for (ViewDock* d : m_window->Docks()) {
     CSuperBaseView* v = d->View();
     const QString cls = d->ClassName();
-    if (v != from && (cls == "CBranticChartView" || cls == "CStockAnalytics" || cls == "CFNews"))
-      v->OnHostMessage(hm::LinkedInstrument, ToLParam(&text));
+    if (v != requester && (cls == "CBranticChartView" || cls == "CStockAnalytics" || cls == "CFNews"))
+      v->OnHostMessage(hm::LinkedInstrument, ToLParam(&linkText));
   }
 }
 

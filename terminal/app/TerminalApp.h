@@ -91,6 +91,7 @@ class TerminalApp : public QObject, public IHostShell {
   // ---- IHostShell ----
   CSuperBaseView* OpenView(const std::wstring& className, CSuperBaseView* requester) override;
   void ForeignLink(const std::wstring& className, const std::wstring& linkText, CSuperBaseView* requester) override;
+  void InstrumentLinked(const std::wstring& linkText, CSuperBaseView* requester) override;
   void ShowNotice(const std::wstring& title, const std::wstring& text) override;
   void ViewTitleChanged(CSuperBaseView* view, const std::wstring& title) override;
   void ViewSizeRequested(CSuperBaseView* view, int width, int height) override;

@@ -63,6 +63,10 @@ class IHostShell {
   virtual CSuperBaseView* OpenView(const std::wstring& className, CSuperBaseView* requester) { return nullptr; }
   // 310 for a class the terminal has no view for: `linkText` is the JSON link text.
   virtual void ForeignLink(const std::wstring& className, const std::wstring& linkText, CSuperBaseView* requester) {}
+  // A view changed the linked instrument (`linkText`: its JSON link text); the
+  // add-on's single-instrument views have had it. The terminal's own views
+  // that follow links take it from here.
+  virtual void InstrumentLinked(const std::wstring& linkText, CSuperBaseView* requester) {}
   // An in-terminal notice (an alert triggered, a save failed).
   virtual void ShowNotice(const std::wstring& title, const std::wstring& text) {}
   // 101: the view's title changed.

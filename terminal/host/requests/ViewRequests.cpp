@@ -55,13 +55,15 @@ void RegisterViewRequests(RequestTable& table) {
   });
   table.On(hm::LinkedInstrument, [](const Request& r) {
     // A view changed the linked instrument: the single-instrument views
-    // follow (when their link flag is on), foreign views through the shell.
+    // follow (when their link flag is on), the terminal's own views and
+    // foreign views through the shell.
     if (!r.data) return;
     const auto* link = r.Data<ViewLink>();
     const std::wstring text = link->link ? *link->link : std::wstring();
     for (CSuperBaseView* t : r.host.views.Of(nullptr))
       if (t != r.view && IsSingleInstrumentView(r.host.views.ClassNameOf(t)))
         r.host.views.Deliver(t, hm::LinkedInstrument, ToLParam(&text));
+    if (!text.empty()) r.host.shell->InstrumentLinked(text, r.view);
     if (!link->className.empty()) r.host.shell->ForeignLink(link->className, text, r.view);
   });
   table.On(hm::CompactLayout, [](const Request& r) { r.host.shell->CompactLayoutChanged(r.view, r.data == 1); });

@@ -346,6 +346,18 @@ TEST(TerminalLinks, ExplorerDoubleClickLinksAndDropsOpenTheInstrumentWithReadabl
     EXPECT_EQ(v->GetStartInstrumentCode(), ins.instrumentCode) << w.DockOf(v)->windowTitle().toStdString();
   EXPECT_EQ(ticket->GetStartInstrumentCode(), "") << "a ticket does not change instrument under the user";
 
+  // A view of the add-on that changes the linked instrument (a price-view row,
+  // an instrument box) takes them along the same way.
+  const auto& other = m.Instruments()[std::size_t(IndexOf(m, "SPX"))];
+  const std::wstring linked = L"{\"type\":\"trade view\",\"data\":[{\"Field_instrument_code\":\"SPX\","
+                              L"\"Field_product_id\":\"" + std::to_wstring(other.productId) + L"\"}]}";
+  ViewLink request;
+  request.link = &linked;
+  app.Runtime().OnChildFeedback(ticket, hm::LinkedInstrument, ToLParam(&request));
+  for (CSuperBaseView* v : {static_cast<CSuperBaseView*>(chart), analytics, news})
+    EXPECT_EQ(v->GetStartInstrumentCode(), "SPX") << w.DockOf(v)->windowTitle().toStdString();
+  EXPECT_EQ(ticket->GetStartInstrumentCode(), "");
+
   // A drag from a price-view row onto the chart opens that instrument there.
   const int spx = IndexOf(m, "SPX");
   const auto& index = m.Instruments()[std::size_t(spx)];
