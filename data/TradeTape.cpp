@@ -121,6 +121,12 @@ constexpr std::size_t kFields = 4;
 std::array<const std::wstring*, kFields> FieldsOf(const TradeRecord& t) { return {&t.time, &t.price, &t.volume, &t.side}; }
 std::array<std::wstring*, kFields> FieldsOf(TradeRecord& t) { return {&t.time, &t.price, &t.volume, &t.side}; }
 
+// Whether `text` starts with the ASCII `prefix`.
+bool StartsWith(std::wstring_view text, const std::string& prefix) {
+  return text.size() >= prefix.size() &&
+         std::equal(prefix.begin(), prefix.end(), text.begin(), [](char a, wchar_t b) { return static_cast<wchar_t>(a) == b; });
+}
+
 }  // namespace
 
 bool TradeTape::Packs(const Block& block, const TradeRecord& trade) {
@@ -141,11 +147,8 @@ bool TradeTape::SameAsPacked(const Block& block, int slot, const TradeRecord& tr
   for (std::size_t f = 0; f < kFields; ++f) {
     std::wstring_view field = *fields[f];
     if (f == 0 && block.prefixed[std::size_t(slot)]) {
-      const std::string& prefix = block.timePrefix;
-      if (field.size() < prefix.size() || !std::equal(prefix.begin(), prefix.end(), field.begin(),
-                                                      [](char a, wchar_t b) { return static_cast<wchar_t>(a) == b; }))
-        return false;
-      field.remove_prefix(prefix.size());
+      if (!StartsWith(field, block.timePrefix)) return false;
+      field.remove_prefix(block.timePrefix.size());
     }
     if (field.size() != s.length[f]) return false;
     for (const wchar_t c : field)
@@ -206,9 +209,7 @@ bool TradeTape::StoreLocked(Tape& tape, TradeRecord&& trade) {
     if (block.timePrefix.empty() && trade.time.size() >= kPrefix)
       block.timePrefix.assign(trade.time.begin(), trade.time.begin() + kPrefix);
     const std::string& prefix = block.timePrefix;
-    const bool prefixed = !prefix.empty() && trade.time.size() >= prefix.size() &&
-                          std::equal(prefix.begin(), prefix.end(), trade.time.begin(),
-                                     [](char a, wchar_t b) { return static_cast<wchar_t>(a) == b; });
+    const bool prefixed = !prefix.empty() && StartsWith(trade.time, prefix);
     block.prefixed[std::size_t(slot)] = prefixed;
     s.at = static_cast<std::uint16_t>(block.text.size());
     const auto fields = FieldsOf(trade);

@@ -73,6 +73,20 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
       out = static_cast<std::remove_reference_t<decltype(*out)>>(n);
       return true;
     };
+    // A factor from `min` to `max`: `what` names it, `one` says what 1 means.
+    auto factor = [&](std::optional<double>& out, double min, double max, const char* what, const char* one) -> bool {
+      std::string text;
+      if (!value(text)) return false;
+      double x = 0;
+      if (!ParseNumber(text, x) || !(x >= min) || !(x <= max)) {
+        char range[64];
+        std::snprintf(range, sizeof range, "%g to %g", min, max);
+        error = arg + ": expected " + what + " from " + range + " (1 is " + one + "), got \"" + text + "\"";
+        return false;
+      }
+      out = x;
+      return true;
+    };
     if (arg == "-h" || arg == "--help") o.help = true;
     else if (arg == "--version") o.version = true;
     else if (arg == "--headless") o.headless = true;
@@ -109,14 +123,7 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
     } else if (arg == "--rate") {
       if (!number(o.rate, 0, 10000000)) return false;
     } else if (arg == "--pace") {
-      std::string text;
-      if (!value(text)) return false;
-      double x = 0;
-      if (!ParseNumber(text, x) || !(x >= 0.1) || !(x <= 100)) {
-        error = "--pace: expected a factor from 0.1 to 100 (1 is the market as it is), got \"" + text + "\"";
-        return false;
-      }
-      o.pace = x;
+      if (!factor(o.pace, 0.1, 100, "a factor", "the market as it is")) return false;
     } else if (arg == "--open") {
       std::string text;
       if (!value(text)) return false;
@@ -163,14 +170,7 @@ bool ParseOptions(int argc, char** argv, Options& o, std::string& error) {
       if (!value(o.replayFile)) return false;
       if (o.replayFile.empty()) { error = "--replay needs a file name"; return false; }
     } else if (arg == "--speed") {
-      std::string text;
-      if (!value(text)) return false;
-      double x = 0;
-      if (!ParseNumber(text, x) || !(x >= 0.1) || !(x <= 1000)) {
-        error = "--speed: expected a speed from 0.1 to 1000 (1 is real time), got \"" + text + "\"";
-        return false;
-      }
-      o.speed = x;
+      if (!factor(o.speed, 0.1, 1000, "a speed", "real time")) return false;
     } else if (arg == "--list-instruments") {
       // The count is optional: take the next word only when it is a number.
       if (hasInline) {

@@ -745,23 +745,20 @@ bool TerminalApp::WriteLatencyReport() {
   m_latency.reset();
   std::fputs(text.c_str(), stdout);
   std::fflush(stdout);
-  std::ofstream f(m_options.latencyReport, std::ios::trunc);
-  if (!(f << text) || !f.flush()) {
-    Progress("error: cannot write " + m_options.latencyReport);
-    return false;
-  }
-  Progress("wrote the latency report to " + m_options.latencyReport);
-  return true;
+  return WriteReport(m_options.latencyReport, text, "latency");
 }
 
 bool TerminalApp::WriteSoakReport(double warmupSeconds) {
-  const std::string text = m_soak->Report(warmupSeconds, kPumpMs);
-  std::ofstream f(m_options.soakReport, std::ios::trunc);
+  return WriteReport(m_options.soakReport, m_soak->Report(warmupSeconds, kPumpMs), "soak");
+}
+
+bool TerminalApp::WriteReport(const std::string& path, const std::string& text, const char* kind) {
+  std::ofstream f(path, std::ios::trunc);
   if (!(f << text) || !f.flush()) {
-    Progress("error: cannot write " + m_options.soakReport);
+    Progress("error: cannot write " + path);
     return false;
   }
-  Progress("wrote the soak report to " + m_options.soakReport);
+  Progress(std::string("wrote the ") + kind + " report to " + path);
   return true;
 }
 

@@ -121,6 +121,8 @@ class TerminalApp : public QObject, public IHostShell {
   void StartLatency();
   bool WriteLatencyReport();
   bool WriteSoakReport(double warmupSeconds);
+  // Writes `text` to `path`; says so, or why not.
+  bool WriteReport(const std::string& path, const std::string& text, const char* kind);
   void OpenDefaultLayout();
   void DeliverLink(CSuperBaseView* view, std::int64_t productId, const std::string& code);
   // Ends the recording, if any, and says how it went. False when it failed.
